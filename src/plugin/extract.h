@@ -1,0 +1,49 @@
+// The extraction frame: one entry written to one output file by the method of
+// its format, ending in finish (0), error exit (12) or abort (21).
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+#include "plugin/session.h"
+#include "util/bytes.h"
+
+namespace cairn {
+
+// Thrown when the progress callback asks to stop.
+struct Aborted {};
+
+struct ExtractionFrame {
+  ArchiveSession& session;
+  const ArchiveEntry& entry;
+  os::Handle archive;
+  os::Handle output;  // created empty, positioned at 0
+  const std::string& destName;
+
+  // Tells the host that `bytes` more are done; throws Aborted on a 0 answer.
+  void Report(uint32_t bytes) const;
+  // Writes at the output's current position; throws BadData on a short write.
+  void Write(ByteView bytes) const;
+  void WriteAt(ByteView bytes, uint32_t position) const;
+};
+
+using MethodFn = void (*)(ExtractionFrame&);
+
+// Copies `size` stored bytes from `offset` to the output in chunks of at most
+// 1 MiB, reporting each chunk. FormatIds 26, 58, 101, 65 and 66 transform the
+// chunks on the way (see RawCopy).
+void CopyStored(ExtractionFrame& f, uint32_t offset, uint32_t size);
+
+// The default method: the entry's stored bytes, with the per-format
+// transforms, composite entries and ZIP header repairs.
+void RawCopy(ExtractionFrame& f);
+
+// Extracts entry `index` of the open session to `destName`. Answers 0, 12, 16
+// or 21; after anything but 0 no output is left behind.
+int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName);
+
+// The 16 key words of the two sound-bank formats, applied by file position
+// modulo 16.
+extern const uint32_t kPositionKeyTable[16];
+
+}  // namespace cairn

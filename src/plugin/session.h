@@ -1,0 +1,99 @@
+// The state of one open archive: its entry table, its time stamps and the
+// host's progress callback; and what a directory reader is given to fill it.
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "util/bytes.h"
+#include "util/file.h"
+#include "util/platform.h"
+
+namespace cairn {
+
+using FormatId = uint32_t;
+
+// Result codes of the host interface.
+enum ResultCode : int {
+  kOk = 0,
+  kEndArchive = 10,
+  kBadData = 12,
+  kUnknownFormat = 14,
+  kOpenFailed = 15,
+  kCreateFailed = 16,
+  kReadFailed = 18,
+  kAborted = 21,
+};
+
+inline constexpr uint32_t kHeaderSize = 104;
+inline constexpr size_t kMaxNameLength = 259;
+
+struct ArchiveEntry {
+  std::string Name;  // '\' between path parts, at most 259 characters
+  uint32_t Offset = 0;
+  uint32_t UnpackedSize = 0;
+  uint32_t PackedSize = 0;
+  uint32_t Extra = 0;  // pictures: width | height << 16; 16-bit sounds: the rate
+  uint8_t Flag = 0;    // per-format method selector or key byte
+};
+
+// Called with the output's name and the bytes done since the last call; 0
+// asks to stop.
+using ProgressFn = std::function<int(const std::string& name, uint32_t bytes)>;
+
+struct ArchiveSession {
+  FormatId format = 0;
+  File archive;
+  std::string path;
+  std::vector<ArchiveEntry> entries;
+  os::FileTimes times;
+  uint32_t dosTime = 0;
+  ProgressFn progress;
+  uint8_t readerFlag = 0;  // one byte of state for the readers that need it
+};
+
+// What a directory reader works with. Readers fill `entries` (AddEntry) and
+// throw BadData when the directory does not hold together.
+struct ReaderContext {
+  ArchiveSession& session;
+  os::Handle archive;
+  ByteView header;  // the first 104 bytes
+  uint32_t fileSize;
+  std::string_view path;
+  std::string_view archiveFileName;
+  std::vector<ArchiveEntry>& entries;
+};
+
+using ReaderFn = void (*)(ReaderContext&, unsigned row);
+
+// Appends an entry; a name of 260 characters or more is refused with BadData.
+ArchiveEntry& AddEntry(ReaderContext& c, std::string_view name, uint32_t offset,
+                       uint32_t unpacked, uint32_t packed, uint8_t flag = 0, uint32_t extra = 0);
+
+// Reads `length` bytes at `position`; refuses with BadData a block that does
+// not lie inside the archive, before anything is allocated.
+std::vector<uint8_t> ReadBlock(const ReaderContext& c, uint64_t position, uint64_t length);
+
+// Sizes each entry as the distance to the next entry's offset, the last one
+// up to `end` (the file size when 0). Offsets must not go backwards.
+void SizesFromOffsets(ReaderContext& c, uint32_t end = 0);
+
+// Lays the entries back to back from `start`, in table order.
+void AssignSequentialOffsets(ReaderContext& c, uint32_t start);
+
+// Opens `path` into the session: recognition, the directory reader, the
+// table. Answers kOk or the host's open result (12, 14, 15, 18); on failure
+// the session holds nothing.
+int OpenArchiveSession(ArchiveSession& s, const std::string& path);
+
+// Ends the session: releases the table and closes the archive.
+void CloseArchiveSession(ArchiveSession& s);
+
+// Recognises the file at `path` without touching any session: the FormatId,
+// or 0 when the file is unknown or its format has no reader.
+FormatId RecogniseFile(const std::string& path);
+
+}  // namespace cairn

@@ -1,0 +1,57 @@
+// The records and exports of the WCX packer-plug-in interface.
+#pragma once
+
+#if defined(_WIN32) && !defined(_WIN64)
+#define WCX_API __stdcall
+#else
+#define WCX_API
+#endif
+
+#if defined(_WIN32)
+#define WCX_EXPORT extern "C" __declspec(dllexport)
+#else
+#define WCX_EXPORT extern "C" __attribute__((visibility("default")))
+#endif
+
+struct tOpenArchiveData {
+  char* ArcName;
+  int OpenMode;
+  int OpenResult;
+  char* CmtBuf;
+  int CmtBufSize;
+  int CmtSize;
+  int CmtState;
+};
+
+struct tHeaderData {
+  char ArcName[260];
+  char FileName[260];
+  int Flags;
+  int PackSize;
+  int UnpSize;
+  int HostOS;
+  int FileCRC;
+  int FileTime;
+  int UnpVer;
+  int Method;
+  int FileAttr;
+  char* CmtBuf;
+  int CmtBufSize;
+  int CmtSize;
+  int CmtState;
+};
+
+typedef int(WCX_API* tProcessDataProc)(char* FileName, int Size);
+typedef int(WCX_API* tChangeVolProc)(char* ArcName, int Mode);
+
+enum { PK_SKIP = 0, PK_TEST = 1, PK_EXTRACT = 2 };
+enum { PK_CAPS_MULTIPLE = 4, PK_CAPS_BY_CONTENT = 64 };
+
+WCX_EXPORT void* WCX_API OpenArchive(tOpenArchiveData* ArchiveData);
+WCX_EXPORT int WCX_API ReadHeader(void* hArcData, tHeaderData* HeaderData);
+WCX_EXPORT int WCX_API ProcessFile(void* hArcData, int Operation, char* DestPath, char* DestName);
+WCX_EXPORT int WCX_API CloseArchive(void* hArcData);
+WCX_EXPORT void WCX_API SetChangeVolProc(void* hArcData, tChangeVolProc pChangeVolProc);
+WCX_EXPORT void WCX_API SetProcessDataProc(void* hArcData, tProcessDataProc pProcessDataProc);
+WCX_EXPORT int WCX_API CanYouHandleThisFile(char* FileName);
+WCX_EXPORT int WCX_API GetPackerCaps(void);

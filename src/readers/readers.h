@@ -1,0 +1,13 @@
+// The directory readers. Each fills the context's entries or throws BadData;
+// `row` selects a layout for the readers that serve several formats.
+#pragma once
+
+#include "plugin/session.h"
+
+namespace cairn {
+
+void RecordTableReader(ReaderContext& c, unsigned row);
+void FieldTableReader(ReaderContext& c, unsigned row);
+void SingleEntryReader(ReaderContext& c, unsigned row);
+
+}  // namespace cairn

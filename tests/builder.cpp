@@ -1,0 +1,73 @@
+#include "builder.h"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <ostream>
+#include <random>
+
+namespace cairn::test {
+
+TempDir::TempDir() {
+  static std::atomic<unsigned> counter{0};
+  std::random_device rd;
+  dir_ = std::filesystem::temp_directory_path() /
+         ("cairn-test-" + std::to_string(rd()) + "-" + std::to_string(counter++));
+  std::filesystem::create_directories(dir_);
+}
+
+TempDir::~TempDir() {
+  std::error_code ec;
+  std::filesystem::remove_all(dir_, ec);
+}
+
+std::string TempDir::write(std::string_view name, const Bytes& b) const {
+  const std::string p = path(name);
+  std::filesystem::create_directories(std::filesystem::path(p).parent_path());
+  std::ofstream f(p, std::ios::binary | std::ios::trunc);
+  f.write(reinterpret_cast<const char*>(b.data()), static_cast<std::streamsize>(b.size()));
+  return p;
+}
+
+Bytes ReadFile(const std::string& path) {
+  std::ifstream f(path, std::ios::binary);
+  return Bytes(std::istreambuf_iterator<char>(f), std::istreambuf_iterator<char>());
+}
+
+bool Exists(const std::string& path) { return std::filesystem::exists(path); }
+
+std::ostream& operator<<(std::ostream& o, const Listed& l) {
+  return o << "{\"" << l.name << "\", " << l.offset << ", " << l.unpacked << ", " << l.packed
+           << ", " << l.extra << ", " << int(l.flag) << "}";
+}
+
+std::vector<Listed> Opened::listing() const {
+  std::vector<Listed> v;
+  for (const ArchiveEntry& e : session.entries)
+    v.push_back({e.Name, e.Offset, e.UnpackedSize, e.PackedSize, e.Extra, e.Flag});
+  return v;
+}
+
+int Opened::extract(size_t index, Bytes& out) {
+  const std::string dest = dir.path("out-" + std::to_string(index));
+  const int r = ExtractEntry(session, index, dest);
+  out = r == kOk ? ReadFile(dest) : Bytes{};
+  if (r != kOk) EXPECT_FALSE(Exists(dest)) << "output left behind after " << r;
+  std::filesystem::remove(dest);
+  return r;
+}
+
+Bytes Opened::extract(size_t index) {
+  Bytes out;
+  EXPECT_EQ(extract(index, out), kOk) << "entry " << index;
+  return out;
+}
+
+std::unique_ptr<Opened> OpenBytes(const Bytes& bytes, std::string_view fileName) {
+  auto o = std::make_unique<Opened>();
+  const std::string p = o->dir.write(fileName, bytes);
+  o->result = OpenArchiveSession(o->session, p);
+  return o;
+}
+
+}  // namespace cairn::test

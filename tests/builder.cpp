@@ -70,4 +70,12 @@ std::unique_ptr<Opened> OpenBytes(const Bytes& bytes, std::string_view fileName)
   return o;
 }
 
+std::unique_ptr<Opened> OpenBytesAs(FormatId format, const Bytes& bytes,
+                                    std::string_view fileName) {
+  auto o = std::make_unique<Opened>();
+  const std::string p = o->dir.write(fileName, bytes);
+  o->result = OpenArchiveAs(o->session, p, format);
+  return o;
+}
+
 }  // namespace cairn::test

@@ -114,5 +114,8 @@ struct Opened {
 
 // Writes `bytes` under `fileName` in a fresh folder and opens it.
 std::unique_ptr<Opened> OpenBytes(const Bytes& bytes, std::string_view fileName = "test.bin");
+// The same, read as FormatId `format` without recognition.
+std::unique_ptr<Opened> OpenBytesAs(FormatId format, const Bytes& bytes,
+                                    std::string_view fileName = "test.bin");
 
 }  // namespace cairn::test

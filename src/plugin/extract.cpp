@@ -194,7 +194,7 @@ int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName) {
   int result = kOk;
   try {
     const FormatInfo* info = FindFormat(s.format);
-    const MethodFn method = info != nullptr && info->id >= 4 ? info->method : RawCopy;
+    const MethodFn method = info != nullptr ? info->method : RawCopy;
     method(f);
     f.Report(entry.PackedSize);
     os::SetTimes(output.get(), s.times);

@@ -57,8 +57,9 @@ struct Opened {
 };
 
 // The steps shared by opening and by the content test: open, read the
-// header, recognise. A format without a reader is not recognised.
-Opened OpenAndRecognise(const std::string& path) {
+// header, recognise (unless `forced` names the format). A format without a
+// reader is not recognised.
+Opened OpenAndRecognise(const std::string& path, FormatId forced = 0) {
   Opened o;
   o.file = File(os::OpenShared(path.c_str()));
   if (!o.file) {
@@ -70,7 +71,8 @@ Opened OpenAndRecognise(const std::string& path) {
     o.result = kReadFailed;
     return o;
   }
-  const FormatId id = DetectFormat(ByteView(o.header), path, o.file.get());
+  const FormatId id =
+      forced != 0 ? forced : DetectFormat(ByteView(o.header), path, o.file.get());
   const FormatInfo* info = FindFormat(id);
   if (info == nullptr || info->reader == nullptr) {
     o.result = kUnknownFormat;
@@ -99,9 +101,13 @@ void CloseArchiveSession(ArchiveSession& s) {
 }
 
 int OpenArchiveSession(ArchiveSession& s, const std::string& path) {
+  return OpenArchiveAs(s, path, 0);
+}
+
+int OpenArchiveAs(ArchiveSession& s, const std::string& path, FormatId format) {
   CloseArchiveSession(s);
   try {
-    Opened o = OpenAndRecognise(path);
+    Opened o = OpenAndRecognise(path, format);
     if (o.result != kOk) return o.result;
     const FormatInfo& info = *FindFormat(o.format);
     const uint32_t size = os::SizeLow(o.file.get());

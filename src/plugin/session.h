@@ -89,6 +89,10 @@ void AssignSequentialOffsets(ReaderContext& c, uint32_t start);
 // the session holds nothing.
 int OpenArchiveSession(ArchiveSession& s, const std::string& path);
 
+// Opens `path` as FormatId `format`, skipping recognition (for formats that
+// recognition cannot reach, and for tests of one reader).
+int OpenArchiveAs(ArchiveSession& s, const std::string& path, FormatId format);
+
 // Ends the session: releases the table and closes the archive.
 void CloseArchiveSession(ArchiveSession& s);
 

@@ -78,4 +78,18 @@ std::unique_ptr<Opened> OpenBytesAs(FormatId format, const Bytes& bytes,
   return o;
 }
 
+std::unique_ptr<Opened> SessionOver(FormatId format, const Bytes& bytes,
+                                    std::vector<ArchiveEntry> entries) {
+  auto o = std::make_unique<Opened>();
+  const std::string p = o->dir.write("archive.bin", bytes);
+  o->session.archive = File(os::OpenShared(p.c_str()));
+  EXPECT_TRUE(o->session.archive);
+  o->session.path = p;
+  o->session.format = format;
+  o->session.entries = std::move(entries);
+  os::GetTimes(o->session.archive.get(), o->session.times);
+  o->result = kOk;
+  return o;
+}
+
 }  // namespace cairn::test

@@ -6,6 +6,7 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -117,5 +118,10 @@ std::unique_ptr<Opened> OpenBytes(const Bytes& bytes, std::string_view fileName 
 // The same, read as FormatId `format` without recognition.
 std::unique_ptr<Opened> OpenBytesAs(FormatId format, const Bytes& bytes,
                                     std::string_view fileName = "test.bin");
+
+// A session over `bytes` with a table made by hand, as a reader would leave
+// it: for tests of the frame and of the methods on their own.
+std::unique_ptr<Opened> SessionOver(FormatId format, const Bytes& bytes,
+                                    std::vector<ArchiveEntry> entries);
 
 }  // namespace cairn::test

@@ -1,0 +1,181 @@
+// The extraction frame and the raw copy: chunking, progress reports, the
+// three endings, file times, and the per-format transforms of the copy.
+#include <sys/stat.h>
+
+#include <gtest/gtest.h>
+
+#include "builder.h"
+#include "plugin/extract.h"
+
+namespace cairn {
+namespace {
+
+using test::Bytes;
+using test::Pattern;
+using test::SessionOver;
+
+ArchiveEntry Entry(uint32_t offset, uint32_t size, uint8_t flag = 0) {
+  return ArchiveEntry{"e", offset, size, size, 0, flag};
+}
+
+// Records every progress report; answers 0 at report number `stopAt`.
+struct Reports {
+  std::vector<uint32_t> sizes;
+  size_t stopAt = SIZE_MAX;
+  void attach(ArchiveSession& s) {
+    s.progress = [this](const std::string&, uint32_t n) {
+      sizes.push_back(n);
+      return sizes.size() == stopAt ? 0 : 1;
+    };
+  }
+};
+
+TEST(RawCopy, AnEmptyEntryGivesAnEmptyFileAndOneReportOfZero) {
+  auto o = SessionOver(15, Pattern(200), {Entry(50, 0)});
+  Reports r;
+  r.attach(o->session);
+  EXPECT_EQ(o->extract(0), Bytes{});
+  EXPECT_EQ(r.sizes, std::vector<uint32_t>{0});
+}
+
+TEST(RawCopy, CopiesInChunksOfOneMiBEachReportedThenTheTotal) {
+  const Bytes data = Pattern(3000100);
+  auto o = SessionOver(15, data, {Entry(100, 3000000)});
+  Reports r;
+  r.attach(o->session);
+  EXPECT_EQ(o->extract(0), test::Slice(data, 100, 3000000));
+  EXPECT_EQ(r.sizes, (std::vector<uint32_t>{1048576, 1048576, 902848, 3000000}));
+}
+
+TEST(RawCopy, AnEntryRunningPastTheEndIsBadDataAndLeavesNoFile) {
+  auto o = SessionOver(15, Pattern(200), {Entry(150, 51), Entry(0xFFFFFFF0u, 4)});
+  Bytes out;
+  EXPECT_EQ(o->extract(0, out), kBadData);
+  EXPECT_EQ(o->extract(1, out), kBadData);
+}
+
+TEST(RawCopy, AStopAskedDuringTheCopyOrAtTheEndAbortsAndLeavesNoFile) {
+  auto o = SessionOver(15, Pattern(2100000), {Entry(0, 2100000)});
+  Reports during;
+  during.stopAt = 2;
+  during.attach(o->session);
+  Bytes out;
+  EXPECT_EQ(o->extract(0, out), kAborted);
+  EXPECT_EQ(during.sizes.size(), 2u);
+
+  Reports atEnd;
+  atEnd.stopAt = 4;  // three chunks, then the final report
+  atEnd.attach(o->session);
+  EXPECT_EQ(o->extract(0, out), kAborted);
+}
+
+TEST(RawCopy, AnUnsetCallbackDoesNotStopTheCopy) {
+  auto o = SessionOver(15, Pattern(300), {Entry(10, 20)});
+  EXPECT_EQ(o->extract(0), test::Slice(Pattern(300), 10, 20));
+}
+
+TEST(RawCopy, TheOutputCarriesTheArchiveTimesAndOverwritesAnExistingFile) {
+  auto o = SessionOver(15, Pattern(300), {Entry(10, 20)});
+  o->session.times.access = 1000000000ull * 1500000000;
+  o->session.times.write = 1000000000ull * 1600000000 + 500;
+  const std::string dest = o->dir.write("existing", Pattern(5000));
+  ASSERT_EQ(ExtractEntry(o->session, 0, dest), kOk);
+  struct stat st {};
+  ASSERT_EQ(stat(dest.c_str(), &st), 0);  // before reading it moves the access time
+  EXPECT_EQ(st.st_mtim.tv_sec, 1600000000);
+  EXPECT_EQ(st.st_mtim.tv_nsec, 500);
+  EXPECT_EQ(st.st_atim.tv_sec, 1500000000);
+  EXPECT_EQ(test::ReadFile(dest), test::Slice(Pattern(300), 10, 20));
+}
+
+TEST(RawCopy, AnOutputThatCannotBeCreatedIsReportedAsSuch) {
+  auto o = SessionOver(15, Pattern(300), {Entry(10, 20)});
+  EXPECT_EQ(ExtractEntry(o->session, 0, o->dir.path("no/such/folder/x")), kCreateFailed);
+  EXPECT_EQ(ExtractEntry(o->session, 0, o->dir.dir().string()), kCreateFailed);
+  EXPECT_EQ(ExtractEntry(o->session, 7, o->dir.path("x")), kBadData);  // no such entry
+  EXPECT_FALSE(test::Exists(o->dir.path("x")));
+}
+
+Bytes Xor(Bytes b, uint8_t key) {
+  for (uint8_t& c : b) c ^= key;
+  return b;
+}
+
+TEST(RawCopy, XorTransformsFollowTheFormatAndTheFlag) {
+  const Bytes data = Pattern(64);
+  const Bytes part = test::Slice(data, 8, 40);
+  EXPECT_EQ(SessionOver(26, data, {Entry(8, 40, 0x5A)})->extract(0), Xor(part, 0x5A));
+  EXPECT_EQ(SessionOver(26, data, {Entry(8, 40, 0)})->extract(0), part);
+  EXPECT_EQ(SessionOver(58, data, {Entry(8, 40, 0x11)})->extract(0), Xor(part, 0x11));
+  EXPECT_EQ(SessionOver(101, data, {Entry(8, 40, 0x6B)})->extract(0), Xor(part, 0x6B));
+  // Other formats copy unchanged whatever the Flag.
+  EXPECT_EQ(SessionOver(3, data, {Entry(8, 40, 0x6B)})->extract(0), part);
+  EXPECT_EQ(SessionOver(15, data, {Entry(8, 40, 0x6B)})->extract(0), part);
+}
+
+TEST(PositionKey, DeciphersTheSignaturesOfTheTwoSoundBanks) {
+  const uint32_t row65[2] = {0x5E3BC515, 0xF314A89A};
+  const uint32_t row66[2] = {0xA1C47D72, 0xF314A89E};
+  EXPECT_EQ(row65[0] ^ kPositionKeyTable[0], 0xFFFFFFFFu);
+  EXPECT_EQ(row65[1] ^ kPositionKeyTable[4], 0u);
+  EXPECT_EQ(row66[0] ^ kPositionKeyTable[0], 0x4798u);
+  EXPECT_EQ(row66[1] ^ kPositionKeyTable[4], 4u);
+}
+
+// Enciphers as the sound banks store their data: each little-endian word at
+// archive position p XOR key word p mod 16.
+Bytes Encipher(Bytes b, uint32_t position) {
+  for (size_t i = 0; i + 4 <= b.size(); i += 4) {
+    const uint32_t key = kPositionKeyTable[(position + i) % 16];
+    for (int k = 0; k < 4; ++k) b[i + k] ^= static_cast<uint8_t>(key >> (8 * k));
+  }
+  return b;
+}
+
+TEST(PositionKey, FlagOneDeciphersByArchivePositionWhateverTheChunking) {
+  const Bytes plain = Pattern(2097160, 9);  // two whole chunks and a little
+  test::ArchiveBuilder a;
+  a.fill(12, 0xEE).bytes(Encipher(plain, 12)).fill(4, 0xEE);
+  for (FormatId format : {65u, 66u}) {
+    auto o = SessionOver(format, a.get(), {Entry(12, 2097160, 1), Entry(12, 16, 0)});
+    EXPECT_EQ(o->extract(0), plain);
+    EXPECT_EQ(o->extract(1), test::Slice(a.get(), 12, 16));  // Flag 0 is stored as is
+  }
+  // The station bank (66) knows no other Flag.
+  EXPECT_EQ(SessionOver(66, a.get(), {Entry(12, 16, 7)})->extract(0), test::Slice(a.get(), 12, 16));
+}
+
+// A station catalogue whose entries 0..179 each hold their own index in four
+// enciphered bytes.
+std::unique_ptr<test::Opened> Catalogue(std::vector<ArchiveEntry> extra) {
+  test::ArchiveBuilder a;
+  std::vector<ArchiveEntry> entries;
+  for (uint32_t i = 0; i < 180; ++i) {
+    const uint32_t at = static_cast<uint32_t>(a.size());
+    a.bytes(Encipher({static_cast<uint8_t>(i), 0, 0, 0}, at));
+    entries.push_back(Entry(at, 4, 1));
+  }
+  for (auto& e : extra) entries.push_back(e);
+  return SessionOver(65, a.get(), entries);
+}
+
+TEST(CompositeTrack, JoinsThreeEntriesChosenByTheFlag) {
+  auto o = Catalogue({Entry(0, 0, 2), Entry(0, 0, 62), Entry(0, 0, 39), Entry(0, 0, 92),
+                      Entry(0, 0, 161)});
+  EXPECT_EQ(o->extract(180), (Bytes{61, 0, 0, 0, 60, 0, 0, 0, 64, 0, 0, 0}));   // T, T-1, T+3
+  EXPECT_EQ(o->extract(181), (Bytes{141, 0, 0, 0, 142, 0, 0, 0, 146, 0, 0, 0}));  // T, T+1, T+5
+  EXPECT_EQ(o->extract(182), (Bytes{92, 0, 0, 0, 91, 0, 0, 0, 93, 0, 0, 0}));  // T, T-1, T+1
+  EXPECT_EQ(o->extract(183), (Bytes{137, 0, 0, 0, 136, 0, 0, 0, 138, 0, 0, 0}));
+  Bytes out;
+  EXPECT_EQ(o->extract(184, out), kBadData);  // table value 0: part -1 is outside
+}
+
+TEST(CompositeTrack, FlagsBeyondTheTableOrPartsOutsideTheTableFail) {
+  auto small = SessionOver(65, Pattern(100), {Entry(0, 4, 2), Entry(0, 4, 162)});
+  Bytes out;
+  EXPECT_EQ(small->extract(0, out), kBadData);  // T = 61 but only two entries
+  EXPECT_EQ(small->extract(1, out), kBadData);
+}
+
+}  // namespace
+}  // namespace cairn

@@ -2,6 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+
 namespace cairn::test {
 
 std::vector<FixtureMaker>& FixtureMakers() {
@@ -30,6 +34,28 @@ TEST(Fixtures, EachListsAndExtractsThroughRecognition) {
       EXPECT_EQ(o->session.entries[i].Name, f.entries[i].name);
       EXPECT_EQ(o->extract(i), f.entries[i].bytes) << f.entries[i].name;
     }
+  }
+}
+
+// Writes every fixture to the folder CAIRN_DUMP_FIXTURES names, for the
+// hosts that run outside this test binary: folder NN holds the archive and
+// its companions, and list.txt has a line "NN FILENAME" for each.
+TEST(Fixtures, DumpWhenAsked) {
+  const char* root = std::getenv("CAIRN_DUMP_FIXTURES");
+  if (root == nullptr) GTEST_SKIP() << "CAIRN_DUMP_FIXTURES is not set";
+  std::ofstream list(std::filesystem::path(root) / "list.txt");
+  int n = 0;
+  for (const Fixture& f : AllFixtures()) {
+    const auto dir = std::filesystem::path(root) / std::to_string(n);
+    std::filesystem::create_directories(dir);
+    for (const auto& [name, bytes] : f.companions) {
+      std::ofstream(dir / name, std::ios::binary)
+          .write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
+    }
+    std::ofstream(dir / f.fileName, std::ios::binary)
+        .write(reinterpret_cast<const char*>(f.bytes.data()), static_cast<std::streamsize>(f.bytes.size()));
+    list << n << ' ' << f.fileName << '\n';
+    ++n;
   }
 }
 

@@ -8,7 +8,8 @@
 #endif
 
 #if defined(_WIN32)
-#define WCX_EXPORT extern "C" __declspec(dllexport)
+// The .def files name the exports, undecorated.
+#define WCX_EXPORT extern "C"
 #else
 #define WCX_EXPORT extern "C" __attribute__((visibility("default")))
 #endif
@@ -41,6 +42,43 @@ struct tHeaderData {
   int CmtState;
 };
 
+#ifdef _WIN32
+struct tOpenArchiveDataW {
+  wchar_t* ArcName;
+  int OpenMode;
+  int OpenResult;
+  wchar_t* CmtBuf;
+  int CmtBufSize;
+  int CmtSize;
+  int CmtState;
+};
+
+// The extended header records: 1024-character names and 64-bit sizes.
+template <typename Char>
+struct tHeaderDataExOf {
+  Char ArcName[1024];
+  Char FileName[1024];
+  int Flags;
+  unsigned int PackSize;
+  unsigned int PackSizeHigh;
+  unsigned int UnpSize;
+  unsigned int UnpSizeHigh;
+  int HostOS;
+  int FileCRC;
+  int FileTime;
+  int UnpVer;
+  int Method;
+  int FileAttr;
+  char* CmtBuf;
+  int CmtBufSize;
+  int CmtSize;
+  int CmtState;
+  char Reserved[1024];
+};
+using tHeaderDataEx = tHeaderDataExOf<char>;
+using tHeaderDataExW = tHeaderDataExOf<wchar_t>;
+#endif
+
 typedef int(WCX_API* tProcessDataProc)(char* FileName, int Size);
 typedef int(WCX_API* tChangeVolProc)(char* ArcName, int Mode);
 
@@ -55,3 +93,12 @@ WCX_EXPORT void WCX_API SetChangeVolProc(void* hArcData, tChangeVolProc pChangeV
 WCX_EXPORT void WCX_API SetProcessDataProc(void* hArcData, tProcessDataProc pProcessDataProc);
 WCX_EXPORT int WCX_API CanYouHandleThisFile(char* FileName);
 WCX_EXPORT int WCX_API GetPackerCaps(void);
+
+#ifdef _WIN32
+WCX_EXPORT void* WCX_API OpenArchiveW(tOpenArchiveDataW* ArchiveData);
+WCX_EXPORT int WCX_API ReadHeaderEx(void* hArcData, tHeaderDataEx* HeaderData);
+WCX_EXPORT int WCX_API ReadHeaderExW(void* hArcData, tHeaderDataExW* HeaderData);
+WCX_EXPORT int WCX_API ProcessFileW(void* hArcData, int Operation, wchar_t* DestPath,
+                                    wchar_t* DestName);
+WCX_EXPORT int WCX_API CanYouHandleThisFileW(wchar_t* FileName);
+#endif

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <string>
 
 namespace cairn::os {
 
@@ -18,6 +19,18 @@ struct FileTimes {
   uint64_t access = 0;
   uint64_t write = 0;
 };
+
+// How the core's paths are spelled: in the system's code page (the ANSI
+// entry points) or in UTF-8 (the wide ones on Windows). The entry point that
+// receives a path sets it; POSIX paths are bytes and ignore it.
+enum class PathEncoding { Ansi, Utf8 };
+PathEncoding SetPathEncoding(PathEncoding e);
+
+#ifdef _WIN32
+// Conversions for the wide entry points of the Windows plug-in.
+std::string Utf8FromWide(const wchar_t* wide);
+std::wstring WideFromAnsi(const std::string& ansi);
+#endif
 
 // Opens an existing regular file for reading, sharing reads with others
 // (archives and their companion files). kNoFile on failure.

@@ -42,6 +42,8 @@ Handle OpenRegular(const char* path, int flags) {
 
 }  // namespace
 
+PathEncoding SetPathEncoding(PathEncoding e) { return e; }
+
 Handle OpenShared(const char* path) { return OpenRegular(path, O_RDONLY); }
 Handle CreateAlways(const char* path) { return OpenRegular(path, O_RDWR | O_CREAT | O_TRUNC); }
 Handle OpenExisting(const char* path) { return OpenRegular(path, O_RDWR); }

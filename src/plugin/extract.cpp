@@ -107,7 +107,9 @@ void RestoreScrambledZip(ExtractionFrame& f) {
     }
     position = next;
   }
-  if (position > UINT32_MAX) throw BadData("ZIP walk past 4 GiB");
+  // The headers must chain up to the end record exactly; a walk that steps
+  // past it would put the end signature in the wrong place.
+  if (position != end) throw BadData("ZIP headers do not reach the end record");
   f.WriteAt(ByteView(reinterpret_cast<const uint8_t*>("PK\5\6"), 4),
             static_cast<uint32_t>(position));
 }
@@ -117,7 +119,9 @@ void RestoreScrambledZip(ExtractionFrame& f) {
 // headers.
 void RestoreStrippedZip(ExtractionFrame& f) {
   f.WriteAt(ByteView(reinterpret_cast<const uint8_t*>("PK\3\4"), 4), 0);
-  uint8_t tail[10];
+  // The entry count and the central directory's offset, 8 bytes apart in
+  // the end record.
+  uint8_t tail[12];
   if (!ReadAt(f.archive, tail, f.entry.PackedSize - 14, sizeof tail))
     throw BadData("no end record");
   const uint16_t count = ByteView(tail, sizeof tail).u16le(0);
@@ -132,7 +136,9 @@ void RestoreStrippedZip(ExtractionFrame& f) {
     if (nameLength > 260) throw BadData("ZIP name too long");
     uint8_t name[260];
     if (!ReadExact(f.archive, name, nameLength)) throw BadData("ZIP name past the end");
-    if (central + 46 + nameLength > UINT32_MAX) throw BadData("central directory past 4 GiB");
+    // The rebuilt headers belong inside the entry, not behind it.
+    if (central + 46 + nameLength > f.entry.PackedSize)
+      throw BadData("central directory past the end");
     f.WriteAt(ByteView(reinterpret_cast<const uint8_t*>("PK\1\2"), 4),
               static_cast<uint32_t>(central));
     central += 46;

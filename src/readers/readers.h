@@ -2,6 +2,9 @@
 // `row` selects a layout for the readers that serve several formats.
 #pragma once
 
+#include <cstdint>
+#include <vector>
+
 #include "plugin/session.h"
 
 namespace cairn {
@@ -9,5 +12,58 @@ namespace cairn {
 void RecordTableReader(ReaderContext& c, unsigned row);
 void FieldTableReader(ReaderContext& c, unsigned row);
 void SingleEntryReader(ReaderContext& c, unsigned row);
+
+// An offset derived by adding up sizes: one that no longer fits in 32 bits
+// cannot lie in the archive.
+inline uint32_t DerivedOffset(uint64_t position) {
+  if (position > UINT32_MAX) throw BadData("offset past 4 GiB");
+  return static_cast<uint32_t>(position);
+}
+
+// How a fixed-size record holds its name, its data offset and its size. With
+// `offsetFirst` a record is offset, size, name; otherwise name, offset, size.
+// The record is as long as the three steps together.
+struct RecordFields {
+  uint32_t nameWidth;
+  uint32_t firstStep;   // from the first numeric field to the size field
+  uint32_t secondStep;  // from the size field to what follows it; 0: no size is stored
+  bool offsetFirst;
+
+  constexpr uint64_t recordSize() const { return uint64_t{nameWidth} + firstStep + secondStep; }
+};
+
+// Reads `count` records laid out as `fields` from `offset` and adds one entry
+// per record, in order: the name field up to its first zero byte, the offset
+// field, and the size field as both sizes (0 when none is stored). The whole
+// directory must lie inside the archive. Answers the directory's bytes, for
+// readers that look at more of each record.
+std::vector<uint8_t> ReadRecordDirectory(ReaderContext& c, uint64_t offset, uint32_t count,
+                                         const RecordFields& fields);
+// The same over a directory already in memory (a companion file's, say).
+void ParseRecordDirectory(ReaderContext& c, ByteView directory, uint32_t count,
+                          const RecordFields& fields);
+
+// Where each field sits in a fixed-size record, in any order. Where the two
+// size positions coincide the entry's sizes are equal.
+struct FieldPositions {
+  uint32_t namePosition;
+  uint32_t nameWidth;
+  uint32_t offsetPosition;
+  uint32_t unpackedPosition;
+  uint32_t packedPosition;
+  uint32_t recordSize;
+
+  constexpr bool fitsRecord() const {
+    return uint64_t{namePosition} + nameWidth <= recordSize &&
+           offsetPosition + 4ull <= recordSize && unpackedPosition + 4ull <= recordSize &&
+           packedPosition + 4ull <= recordSize;
+  }
+};
+
+// Reads `count` records of `fields.recordSize` bytes from `offset` and adds
+// one entry per record, in order. The whole directory must lie inside the
+// archive, and every field inside its record.
+void ReadFieldDirectory(ReaderContext& c, uint64_t offset, uint32_t count,
+                        const FieldPositions& fields);
 
 }  // namespace cairn

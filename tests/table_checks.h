@@ -1,0 +1,50 @@
+// Checks shared by the tests of the table-driven readers: an archive opened
+// as one format lists exactly and extracts every entry exactly.
+#pragma once
+
+#include <gtest/gtest.h>
+#include <zlib.h>
+
+#include <string_view>
+#include <vector>
+
+#include "builder.h"
+#include "fixtures.h"
+
+namespace cairn::test {
+
+inline void ExpectListsAndExtracts(FormatId id, const Fixture& f,
+                                   const std::vector<Listed>& listing) {
+  auto o = OpenBytesAs(id, f.bytes, f.fileName);
+  ASSERT_EQ(o->result, kOk);
+  EXPECT_EQ(o->session.format, id);
+  ASSERT_EQ(o->listing(), listing);
+  ASSERT_EQ(f.entries.size(), listing.size());
+  for (size_t i = 0; i < f.entries.size(); ++i) {
+    EXPECT_EQ(listing[i].name, f.entries[i].name);
+    EXPECT_EQ(o->extract(i), f.entries[i].bytes) << f.entries[i].name;
+  }
+}
+
+// Opens `bytes` as FormatId `id` and expects the open to be refused.
+inline void ExpectRefused(FormatId id, const Bytes& bytes, std::string_view fileName = "bad.bin") {
+  auto o = OpenBytesAs(id, bytes, fileName);
+  EXPECT_EQ(o->result, kBadData);
+  EXPECT_TRUE(o->session.entries.empty());
+}
+
+// A complete zlib stream of `data`.
+inline Bytes Compress(const Bytes& data, int level = Z_DEFAULT_COMPRESSION) {
+  uLongf size = compressBound(static_cast<uLong>(data.size()));
+  Bytes out(size);
+  EXPECT_EQ(compress2(out.data(), &size, data.data(), static_cast<uLong>(data.size()), level),
+            Z_OK);
+  out.resize(size);
+  return out;
+}
+
+inline Bytes Text(std::string_view s) {
+  return Bytes(s.begin(), s.end());
+}
+
+}  // namespace cairn::test

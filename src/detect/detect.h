@@ -1,7 +1,13 @@
 // Recognition: the FormatId of a file from its first 104 bytes, its size, its
 // path and, for a few formats, a companion file beside it.
+//
+// Two stages: the magics of the signature table, compared at offset 0 in row
+// order (FormatIds 1 to 79), then the ordered structural and extension rules
+// (FormatIds 80 to 157). The first match decides.
 #pragma once
 
+#include <cstdint>
+#include <span>
 #include <string_view>
 
 #include "plugin/session.h"
@@ -13,5 +19,21 @@ namespace cairn {
 // `header` holds the first 104 bytes of the open file `h`; `path` may be
 // empty. Answers 1..157, or 0 when no signature or rule matches.
 FormatId DetectFormat(ByteView header, std::string_view path, os::Handle h);
+
+// One row of the signature table: row n stands for FormatId n.
+struct Signature {
+  FormatId id;
+  std::string_view magic;  // compared whole, case included, at offset 0
+};
+std::span<const Signature> SignatureTable();
+
+// The first stage alone: the FormatId of the first row whose magic begins
+// `header`, or 0.
+FormatId MatchSignature(ByteView header);
+
+// The second stage alone, for a header that no magic matched: `size` is the
+// file size the rules compare with, `h` the file some rules read from (reads
+// from kNoFile simply fail). Answers 80..157 or 0.
+FormatId DetectByRules(ByteView header, std::string_view path, os::Handle h, uint32_t size);
 
 }  // namespace cairn

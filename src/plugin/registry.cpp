@@ -19,7 +19,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {5, "wad3", "\"WAD3\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
     {6, "iwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
     {7, "pack-rle", "\"PACK\" compressed file", nullptr, 0, RawCopy},  // pending: RLE
-    {8, "paq", "\"paq\" archive", nullptr, 0, RawCopy},
+    {8, "paq", "\"paq\" archive", ChainedItemReader, 0, RawCopy},
     {9, "afs", "\"AFS\" archive", nullptr, 0, RawCopy},
     {10, "lod", "\"LOD\" archive", FieldTableReader, 0, Inflate},
     {11, "csid", "\"CSid\" archive", FieldTableReader, 2, RawCopy},
@@ -38,8 +38,8 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {24, "dorba", "\"DorbaMistfel\" group archive", RecordTableReader, 8, RawCopy},
     {25, "tribe", "typed resource archive", nullptr, 0, RawCopy},
     {26, "gscfmt", "\"GSCfmt\" archive", nullptr, 0, RawCopy},
-    {27, "vxbg", "\"VXBG\" archive", nullptr, 0, RawCopy},
-    {28, "mna", "\"MNA\" archive", nullptr, 0, RawCopy},
+    {27, "vxbg", "\"VXBG\" archive", LineDirectoryReader, 0, RawCopy},
+    {28, "mna", "\"MNA\" archive", ChainedItemReader, 1, RawCopy},
     {29, "hak", "\"HAK V1.0\" archive", nullptr, 0, RawCopy},
     {30, "cmpr", "\"CMPR\" archive", nullptr, 0, RawCopy},
     {31, "dwfb", "\"DWFB\" archive", nullptr, 0, RawCopy},
@@ -51,12 +51,12 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {37, "l33t", "\"l33t\" compressed file", nullptr, 0, Inflate},
     {38, "pvol", "\"PVOL\" archive", nullptr, 0, RawCopy},
     {39, "tr4", "\"TR4\" level file", nullptr, 0, RawOrInflate},  // TGA header then inflate for Flag 2 and up
-    {40, "1xfg", "\"1XFG\" chunk file", nullptr, 0, RawCopy},  // pending: TGA
+    {40, "1xfg", "\"1XFG\" chunk file", ChainedItemReader, 2, RawCopy},  // pending: TGA
     {41, "gaba", "\"GABA\" sound archive", nullptr, 0, RawCopy},  // pending: WAV
     {42, "dir2048", "directory of signature row 42", RecordTableReader, 10, RawCopy},
     {43, "h4campaign", "\"H4CAMPAIGN\" wrapper", SingleEntryReader, 3, RawCopy},
     {44, "h4r", "\"H4R\" archive", nullptr, 0, RawCopy},
-    {45, "actrhead", "\"ACTRHEAD\" item file", nullptr, 0, RawCopy},
+    {45, "actrhead", "\"ACTRHEAD\" item file", ChainedItemReader, 3, RawCopy},
     {46, "snok", "\"SNOK_DATAFILE_KEEP_OUT!\" archive", nullptr, 0, Inflate},
     {47, "avix", "\"AVIX\" picture file", nullptr, 0, RawCopy},  // pending: TGA
     {48, "nldir", "newline directory", nullptr, 0, RawCopy},

@@ -10,4 +10,8 @@ void RecordTableReader(ReaderContext& c, unsigned row);
 void FieldTableReader(ReaderContext& c, unsigned row);
 void SingleEntryReader(ReaderContext& c, unsigned row);
 
+// Chained items and the line directory (chained_items.cpp).
+void ChainedItemReader(ReaderContext& c, unsigned row);
+void LineDirectoryReader(ReaderContext& c, unsigned row);
+
 }  // namespace cairn

@@ -14,4 +14,9 @@ void SingleEntryReader(ReaderContext& c, unsigned row);
 void ChainedItemReader(ReaderContext& c, unsigned row);
 void LineDirectoryReader(ReaderContext& c, unsigned row);
 
+// Folder tree, typed tables and keyed records (folder_trees.cpp).
+void FolderTreeReader(ReaderContext& c, unsigned row);
+void TypedTableReader(ReaderContext& c, unsigned row);
+void KeyedRecordReader(ReaderContext& c, unsigned row);
+
 }  // namespace cairn

@@ -19,4 +19,7 @@ void FolderTreeReader(ReaderContext& c, unsigned row);
 void TypedTableReader(ReaderContext& c, unsigned row);
 void KeyedRecordReader(ReaderContext& c, unsigned row);
 
+// Directories with a separate name block (name_blocks.cpp).
+void NameBlockReader(ReaderContext& c, unsigned row);
+
 }  // namespace cairn

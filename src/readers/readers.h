@@ -66,4 +66,16 @@ struct FieldPositions {
 void ReadFieldDirectory(ReaderContext& c, uint64_t offset, uint32_t count,
                         const FieldPositions& fields);
 
+// Chained items and the line directory (chained_items.cpp).
+void ChainedItemReader(ReaderContext& c, unsigned row);
+void LineDirectoryReader(ReaderContext& c, unsigned row);
+
+// Folder tree, typed tables and keyed records (folder_trees.cpp).
+void FolderTreeReader(ReaderContext& c, unsigned row);
+void TypedTableReader(ReaderContext& c, unsigned row);
+void KeyedRecordReader(ReaderContext& c, unsigned row);
+
+// Directories with a separate name block (name_blocks.cpp).
+void NameBlockReader(ReaderContext& c, unsigned row);
+
 }  // namespace cairn

@@ -1,0 +1,35 @@
+// Checks a registered fixture through its reader alone, without recognition:
+// the listing holds exactly the fixture's names and every entry extracts to
+// exactly the fixture's bytes.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include "fixtures.h"
+
+namespace cairn::test {
+
+// With `convertedReady` false, entries of the conversion folders are listed
+// but not extracted (their writer is not part of the build yet).
+inline void ReplayFixture(const Fixture& f, bool convertedReady = true) {
+  SCOPED_TRACE(f.label);
+  auto o = OpenBytesAs(f.id, f.bytes, f.fileName);
+  ASSERT_EQ(o->result, kOk);
+  ASSERT_EQ(o->session.entries.size(), f.entries.size());
+  for (size_t i = 0; i < f.entries.size(); ++i) {
+    const std::string& name = f.entries[i].name;
+    EXPECT_EQ(o->session.entries[i].Name, name);
+    if (!convertedReady && name.starts_with("_TO_")) continue;
+    EXPECT_EQ(o->extract(i), f.entries[i].bytes) << name;
+  }
+}
+
+// An archive the reader must refuse: OpenResult 12 and no session left.
+inline void ExpectRefused(FormatId id, const Bytes& bytes, std::string_view fileName = "test.bin") {
+  auto o = OpenBytesAs(id, bytes, fileName);
+  EXPECT_EQ(o->result, kBadData);
+  EXPECT_TRUE(o->session.entries.empty());
+  EXPECT_FALSE(o->session.archive);
+}
+
+}  // namespace cairn::test

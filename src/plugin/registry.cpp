@@ -12,9 +12,9 @@ namespace {
 // Row n describes FormatId n. A format whose reader is null is answered as
 // not recognised, so that the host can offer the file to someone else.
 constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
-    {1, "mhx", "\"MHX XS V1.0\" archive", nullptr, 0, RawCopy},
-    {2, "dir", "\"DIR\" archive", nullptr, 0, RawCopy},
-    {3, "far", "\"FAR!byAZ\" archive", nullptr, 0, RawCopy},
+    {1, "mhx", "\"MHX XS V1.0\" archive", NamedRecordReader, 0, RawCopy},
+    {2, "dir", "\"DIR\" archive", DirReader, 0, RawCopy},
+    {3, "far", "\"FAR!byAZ\" archive", FarReader, 0, RawCopy},
     {4, "wad2", "\"WAD2\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
     {5, "wad3", "\"WAD3\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
     {6, "iwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
@@ -23,15 +23,15 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {9, "afs", "\"AFS\" archive", nullptr, 0, RawCopy},
     {10, "lod", "\"LOD\" archive", FieldTableReader, 0, Inflate},
     {11, "csid", "\"CSid\" archive", FieldTableReader, 2, RawCopy},
-    {12, "magegold", "\"MageGold\" archive", nullptr, 0, RawCopy},
+    {12, "magegold", "\"MageGold\" archive", NamedRecordReader, 1, RawCopy},
     {13, "archive22", "\"archive  V2.2\" archive", nullptr, 0, RawCopy},
     {14, "stor", "\"StOR\" archive", nullptr, 0, RawCopy},
     {15, "glb2", "\"GLB2.0\" archive", RecordTableReader, 0, RawCopy},
     {16, "big4", "\"BIG4\" archive", nullptr, 0, RawCopy},
     {17, "fastf", "\"FASTF101\" archive", RecordTableReader, 1, RawCopy},
-    {18, "dfp1", "\"DFP1\" archive", nullptr, 0, RawCopy},
-    {19, "pff2", "\"PFF2\", \"PFF3\" archives", nullptr, 0, RawCopy},
-    {20, "pff3", "\"PFF2\", \"PFF3\" archives", nullptr, 0, RawCopy},
+    {18, "dfp1", "\"DFP1\" archive", Dfp1Reader, 0, RawCopy},
+    {19, "pff2", "\"PFF2\", \"PFF3\" archives", NamedRecordReader, 2, RawCopy},
+    {20, "pff3", "\"PFF2\", \"PFF3\" archives", NamedRecordReader, 2, RawCopy},
     {21, "datos", "\"DATOS\" folder archive", nullptr, 0, RawCopy},
     {22, "sbf0", "\"SBF0\" archive", RecordTableReader, 7, RawCopy},
     {23, "massive", "\"MASSIVE PAKFILE V 4.0\" archive", nullptr, 0, RawCopy},
@@ -41,7 +41,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {27, "vxbg", "\"VXBG\" archive", nullptr, 0, RawCopy},
     {28, "mna", "\"MNA\" archive", nullptr, 0, RawCopy},
     {29, "hak", "\"HAK V1.0\" archive", nullptr, 0, RawCopy},
-    {30, "cmpr", "\"CMPR\" archive", nullptr, 0, RawCopy},
+    {30, "cmpr", "\"CMPR\" archive", CmprReader, 0, RawCopy},
     {31, "dwfb", "\"DWFB\" archive", nullptr, 0, RawCopy},
     {32, "f5cd", "\"F5CD\", \"IPF1\" wrappers", SingleEntryReader, 1, RawCopy},
     {33, "ipf1", "\"F5CD\", \"IPF1\" wrappers", SingleEntryReader, 2, RawCopy},
@@ -49,7 +49,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {35, "nemo", "\"Nemo Fi\" two-part file", nullptr, 0, RawOrInflate},
     {36, "objpkg", "object package", nullptr, 0, RawCopy},
     {37, "l33t", "\"l33t\" compressed file", nullptr, 0, Inflate},
-    {38, "pvol", "\"PVOL\" archive", nullptr, 0, RawCopy},
+    {38, "pvol", "\"PVOL\" archive", PvolReader, 0, RawCopy},
     {39, "tr4", "\"TR4\" level file", nullptr, 0, RawOrInflate},  // TGA header then inflate for Flag 2 and up
     {40, "1xfg", "\"1XFG\" chunk file", nullptr, 0, RawCopy},  // pending: TGA
     {41, "gaba", "\"GABA\" sound archive", nullptr, 0, RawCopy},  // pending: WAV

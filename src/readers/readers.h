@@ -10,4 +10,14 @@ void RecordTableReader(ReaderContext& c, unsigned row);
 void FieldTableReader(ReaderContext& c, unsigned row);
 void SingleEntryReader(ReaderContext& c, unsigned row);
 
+// Directories whose records carry the names (inline_names.cpp).
+// Counted arrays of equal records: row 0 "MHX XS V1.0", 1 "MageGold",
+// 2 "PFF2"/"PFF3".
+void NamedRecordReader(ReaderContext& c, unsigned row);
+void DirReader(ReaderContext& c, unsigned row);   // "DIR"
+void FarReader(ReaderContext& c, unsigned row);   // "FAR!byAZ"
+void Dfp1Reader(ReaderContext& c, unsigned row);  // "DFP1"
+void CmprReader(ReaderContext& c, unsigned row);  // "CMPR"
+void PvolReader(ReaderContext& c, unsigned row);  // "PVOL"
+
 }  // namespace cairn

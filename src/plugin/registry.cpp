@@ -15,8 +15,8 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {1, "mhx", "\"MHX XS V1.0\" archive", NamedRecordReader, 0, RawCopy},
     {2, "dir", "\"DIR\" archive", DirReader, 0, RawCopy},
     {3, "far", "\"FAR!byAZ\" archive", FarReader, 0, RawCopy},
-    {4, "wad2", "\"WAD2\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
-    {5, "wad3", "\"WAD3\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
+    {4, "wad2", "\"WAD2\" texture archive", TextureArchiveReader, 0, RawCopy},  // pending: TGA
+    {5, "wad3", "\"WAD3\" texture archive", TextureArchiveReader, 1, RawCopy},  // pending: TGA
     {6, "iwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
     {7, "pack-rle", "\"PACK\" compressed file", nullptr, 0, RawCopy},  // pending: RLE
     {8, "paq", "\"paq\" archive", nullptr, 0, RawCopy},
@@ -81,7 +81,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {67, "mix1", "\"MIX1\" archive", nullptr, 0, RawCopy},
     {68, "thu3", "\"THU3\" archive", nullptr, 0, RawCopy},
     {69, "sdpa", "\"SDPA\" sound archive", nullptr, 0, RawCopy},
-    {70, "pack-dir", "\"PACK\" directory archive", nullptr, 0, RawCopy},  // pending: TGA
+    {70, "pack-dir", "\"PACK\" directory archive", TextureArchiveReader, 2, RawCopy},  // pending: TGA
     {71, "tex1", "\"TEX\" texture lists", nullptr, 0, RawCopy},  // pending: TGA
     {72, "tex2", "\"TEX\" texture lists", nullptr, 0, RawCopy},  // pending: TGA
     {73, "xcr", "\"xcr File 1.00\" archive", FieldTableReader, 6, RawCopy},

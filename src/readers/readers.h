@@ -20,4 +20,8 @@ void Dfp1Reader(ReaderContext& c, unsigned row);  // "DFP1"
 void CmprReader(ReaderContext& c, unsigned row);  // "CMPR"
 void PvolReader(ReaderContext& c, unsigned row);  // "PVOL"
 
+// Lump archives with TGA copies of their pictures (textures.cpp): row 0
+// "WAD2", 1 "WAD3", 2 the "PACK" directory archive.
+void TextureArchiveReader(ReaderContext& c, unsigned row);
+
 }  // namespace cairn

@@ -18,7 +18,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {4, "wad2", "\"WAD2\" texture archive", TextureArchiveReader, 0, RawCopy},  // pending: TGA
     {5, "wad3", "\"WAD3\" texture archive", TextureArchiveReader, 1, RawCopy},  // pending: TGA
     {6, "iwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
-    {7, "pack-rle", "\"PACK\" compressed file", nullptr, 0, RawCopy},  // pending: RLE
+    {7, "pack-rle", "\"PACK\" compressed file", SingleStreamReader, 0, RawCopy},  // pending: RLE
     {8, "paq", "\"paq\" archive", nullptr, 0, RawCopy},
     {9, "afs", "\"AFS\" archive", nullptr, 0, RawCopy},
     {10, "lod", "\"LOD\" archive", FieldTableReader, 0, Inflate},
@@ -46,9 +46,9 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {32, "f5cd", "\"F5CD\", \"IPF1\" wrappers", SingleEntryReader, 1, RawCopy},
     {33, "ipf1", "\"F5CD\", \"IPF1\" wrappers", SingleEntryReader, 2, RawCopy},
     {34, "pwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
-    {35, "nemo", "\"Nemo Fi\" two-part file", nullptr, 0, RawOrInflate},
+    {35, "nemo", "\"Nemo Fi\" two-part file", SingleStreamReader, 1, RawOrInflate},
     {36, "objpkg", "object package", nullptr, 0, RawCopy},
-    {37, "l33t", "\"l33t\" compressed file", nullptr, 0, Inflate},
+    {37, "l33t", "\"l33t\" compressed file", SingleStreamReader, 2, Inflate},
     {38, "pvol", "\"PVOL\" archive", PvolReader, 0, RawCopy},
     {39, "tr4", "\"TR4\" level file", nullptr, 0, RawOrInflate},  // TGA header then inflate for Flag 2 and up
     {40, "1xfg", "\"1XFG\" chunk file", nullptr, 0, RawCopy},  // pending: TGA
@@ -58,10 +58,10 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {44, "h4r", "\"H4R\" archive", nullptr, 0, RawCopy},
     {45, "actrhead", "\"ACTRHEAD\" item file", nullptr, 0, RawCopy},
     {46, "snok", "\"SNOK_DATAFILE_KEEP_OUT!\" archive", nullptr, 0, Inflate},
-    {47, "avix", "\"AVIX\" picture file", nullptr, 0, RawCopy},  // pending: TGA
+    {47, "avix", "\"AVIX\" picture file", SingleStreamReader, 3, RawCopy},  // pending: TGA
     {48, "nldir", "newline directory", nullptr, 0, RawCopy},
     {49, "palettefiles", "\"PALETTEFILES \" section file", nullptr, 0, RawCopy},
-    {50, "jdlz", "\"JDLZ\" compressed file", nullptr, 0, RawCopy},  // pending: JDLZ
+    {50, "jdlz", "\"JDLZ\" compressed file", SingleStreamReader, 4, RawCopy},  // pending: JDLZ
     {51, "bikwrap", "video wrapper of signature row 51", SingleEntryReader, 4, RawCopy},
     {52, "big", "\"BIG\" archive", nullptr, 0, RawCopy},
     {53, "_archive", "\"_ARCHIVE\" archive", nullptr, 0, RawOrInflate},

@@ -24,4 +24,8 @@ void PvolReader(ReaderContext& c, unsigned row);  // "PVOL"
 // "WAD2", 1 "WAD3", 2 the "PACK" directory archive.
 void TextureArchiveReader(ReaderContext& c, unsigned row);
 
+// Files that are one stream behind a small header (single_stream.cpp): row 0
+// "PACK" compressed file, 1 "Nemo Fi", 2 "l33t", 3 "AVIX", 4 "JDLZ".
+void SingleStreamReader(ReaderContext& c, unsigned row);
+
 }  // namespace cairn

@@ -12,26 +12,26 @@ namespace {
 // Row n describes FormatId n. A format whose reader is null is answered as
 // not recognised, so that the host can offer the file to someone else.
 constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
-    {1, "mhx", "\"MHX XS V1.0\" archive", nullptr, 0, RawCopy},
-    {2, "dir", "\"DIR\" archive", nullptr, 0, RawCopy},
-    {3, "far", "\"FAR!byAZ\" archive", nullptr, 0, RawCopy},
-    {4, "wad2", "\"WAD2\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
-    {5, "wad3", "\"WAD3\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
+    {1, "mhx", "\"MHX XS V1.0\" archive", NamedRecordReader, 0, RawCopy},
+    {2, "dir", "\"DIR\" archive", DirReader, 0, RawCopy},
+    {3, "far", "\"FAR!byAZ\" archive", FarReader, 0, RawCopy},
+    {4, "wad2", "\"WAD2\" texture archive", TextureArchiveReader, 0, RawCopy},  // pending: TGA
+    {5, "wad3", "\"WAD3\" texture archive", TextureArchiveReader, 1, RawCopy},  // pending: TGA
     {6, "iwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
-    {7, "pack-rle", "\"PACK\" compressed file", nullptr, 0, RawCopy},  // pending: RLE
+    {7, "pack-rle", "\"PACK\" compressed file", SingleStreamReader, 0, RawCopy},  // pending: RLE
     {8, "paq", "\"paq\" archive", ChainedItemReader, 0, RawCopy},
     {9, "afs", "\"AFS\" archive", NameBlockReader, 0, RawCopy},
     {10, "lod", "\"LOD\" archive", FieldTableReader, 0, Inflate},
     {11, "csid", "\"CSid\" archive", FieldTableReader, 2, RawCopy},
-    {12, "magegold", "\"MageGold\" archive", nullptr, 0, RawCopy},
+    {12, "magegold", "\"MageGold\" archive", NamedRecordReader, 1, RawCopy},
     {13, "archive22", "\"archive  V2.2\" archive", NameBlockReader, 1, RawCopy},
     {14, "stor", "\"StOR\" archive", NameBlockReader, 2, RawCopy},
     {15, "glb2", "\"GLB2.0\" archive", RecordTableReader, 0, RawCopy},
     {16, "big4", "\"BIG4\" archive", nullptr, 0, RawCopy},
     {17, "fastf", "\"FASTF101\" archive", RecordTableReader, 1, RawCopy},
-    {18, "dfp1", "\"DFP1\" archive", nullptr, 0, RawCopy},
-    {19, "pff2", "\"PFF2\", \"PFF3\" archives", nullptr, 0, RawCopy},
-    {20, "pff3", "\"PFF2\", \"PFF3\" archives", nullptr, 0, RawCopy},
+    {18, "dfp1", "\"DFP1\" archive", Dfp1Reader, 0, RawCopy},
+    {19, "pff2", "\"PFF2\", \"PFF3\" archives", NamedRecordReader, 2, RawCopy},
+    {20, "pff3", "\"PFF2\", \"PFF3\" archives", NamedRecordReader, 2, RawCopy},
     {21, "datos", "\"DATOS\" folder archive", FolderTreeReader, 0, RawCopy},
     {22, "sbf0", "\"SBF0\" archive", RecordTableReader, 7, RawCopy},
     {23, "massive", "\"MASSIVE PAKFILE V 4.0\" archive", nullptr, 0, RawCopy},
@@ -41,15 +41,15 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {27, "vxbg", "\"VXBG\" archive", LineDirectoryReader, 0, RawCopy},
     {28, "mna", "\"MNA\" archive", ChainedItemReader, 1, RawCopy},
     {29, "hak", "\"HAK V1.0\" archive", NameBlockReader, 3, RawCopy},
-    {30, "cmpr", "\"CMPR\" archive", nullptr, 0, RawCopy},
+    {30, "cmpr", "\"CMPR\" archive", CmprReader, 0, RawCopy},
     {31, "dwfb", "\"DWFB\" archive", NameBlockReader, 4, RawCopy},
     {32, "f5cd", "\"F5CD\", \"IPF1\" wrappers", SingleEntryReader, 1, RawCopy},
     {33, "ipf1", "\"F5CD\", \"IPF1\" wrappers", SingleEntryReader, 2, RawCopy},
     {34, "pwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
-    {35, "nemo", "\"Nemo Fi\" two-part file", nullptr, 0, RawOrInflate},
+    {35, "nemo", "\"Nemo Fi\" two-part file", SingleStreamReader, 1, RawOrInflate},
     {36, "objpkg", "object package", nullptr, 0, RawCopy},
-    {37, "l33t", "\"l33t\" compressed file", nullptr, 0, Inflate},
-    {38, "pvol", "\"PVOL\" archive", nullptr, 0, RawCopy},
+    {37, "l33t", "\"l33t\" compressed file", SingleStreamReader, 2, Inflate},
+    {38, "pvol", "\"PVOL\" archive", PvolReader, 0, RawCopy},
     {39, "tr4", "\"TR4\" level file", nullptr, 0, RawOrInflate},  // TGA header then inflate for Flag 2 and up
     {40, "1xfg", "\"1XFG\" chunk file", ChainedItemReader, 2, RawCopy},  // pending: TGA
     {41, "gaba", "\"GABA\" sound archive", nullptr, 0, RawCopy},  // pending: WAV
@@ -58,10 +58,10 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {44, "h4r", "\"H4R\" archive", nullptr, 0, RawCopy},
     {45, "actrhead", "\"ACTRHEAD\" item file", ChainedItemReader, 3, RawCopy},
     {46, "snok", "\"SNOK_DATAFILE_KEEP_OUT!\" archive", nullptr, 0, Inflate},
-    {47, "avix", "\"AVIX\" picture file", nullptr, 0, RawCopy},  // pending: TGA
+    {47, "avix", "\"AVIX\" picture file", SingleStreamReader, 3, RawCopy},  // pending: TGA
     {48, "nldir", "newline directory", nullptr, 0, RawCopy},
     {49, "palettefiles", "\"PALETTEFILES \" section file", nullptr, 0, RawCopy},
-    {50, "jdlz", "\"JDLZ\" compressed file", nullptr, 0, RawCopy},  // pending: JDLZ
+    {50, "jdlz", "\"JDLZ\" compressed file", SingleStreamReader, 4, RawCopy},  // pending: JDLZ
     {51, "bikwrap", "video wrapper of signature row 51", SingleEntryReader, 4, RawCopy},
     {52, "big", "\"BIG\" archive", nullptr, 0, RawCopy},
     {53, "_archive", "\"_ARCHIVE\" archive", nullptr, 0, RawOrInflate},
@@ -81,7 +81,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {67, "mix1", "\"MIX1\" archive", nullptr, 0, RawCopy},
     {68, "thu3", "\"THU3\" archive", nullptr, 0, RawCopy},
     {69, "sdpa", "\"SDPA\" sound archive", nullptr, 0, RawCopy},
-    {70, "pack-dir", "\"PACK\" directory archive", nullptr, 0, RawCopy},  // pending: TGA
+    {70, "pack-dir", "\"PACK\" directory archive", TextureArchiveReader, 2, RawCopy},  // pending: TGA
     {71, "tex1", "\"TEX\" texture lists", nullptr, 0, RawCopy},  // pending: TGA
     {72, "tex2", "\"TEX\" texture lists", nullptr, 0, RawCopy},  // pending: TGA
     {73, "xcr", "\"xcr File 1.00\" archive", FieldTableReader, 6, RawCopy},

@@ -145,6 +145,7 @@ std::vector<Row> ListedRows(const std::string& out, std::string* total = nullptr
 // Every regular file below `root`, by '/'-joined relative path.
 std::map<std::string, Bytes> FilesBelow(const fs::path& root) {
   std::map<std::string, Bytes> files;
+  if (!fs::is_directory(root)) return files;
   for (const auto& e : fs::recursive_directory_iterator(root))
     if (e.is_regular_file() && !e.is_symlink())
       files[fs::relative(e.path(), root).generic_string()] = ReadFile(e.path().string());

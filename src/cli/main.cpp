@@ -1,1 +1,82 @@
-int main() { return 0; }
+// The `cairn` command-line tool: lists, extracts and recognises game resource
+// archives through the same core as the file-manager plug-in.
+#include <fmt/core.h>
+
+#include <CLI/CLI.hpp>
+#include <exception>
+#include <string>
+#include <vector>
+
+#include "cli/commands.h"
+
+#ifndef CAIRN_VERSION
+#define CAIRN_VERSION "unknown"
+#endif
+
+namespace {
+
+constexpr const char* kExitStatusHelp =
+    "Exit status:\n"
+    "  0    done\n"
+    "  1    an archive or file could not be opened, read or recognised\n"
+    "  2    the command line was not understood\n"
+    "  3    some entries were not extracted (refused, already present, damaged,\n"
+    "       not creatable), or a NAME matched no entry\n"
+    "  130  interrupted; the entry being written was removed\n"
+    "Problems are reported one per line on standard error: \"cairn: FILE: reason\".";
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  using namespace cairn::cli;
+
+  CLI::App app{"cairn lists and extracts the resource archives of old games.", "cairn"};
+  app.set_version_flag("--version", std::string("cairn ") + CAIRN_VERSION);
+  app.require_subcommand(1);
+  app.footer(kExitStatusHelp);
+
+  std::string listArchive;
+  CLI::App* list = app.add_subcommand("list", "Show the entries of an archive with their sizes");
+  list->add_option("ARCHIVE", listArchive, "The archive file")->required();
+
+  ExtractOptions extract;
+  CLI::App* extractCommand = app.add_subcommand(
+      "extract", "Write the entries of an archive, or those matching NAME, into a folder");
+  extractCommand->add_option("ARCHIVE", extract.archive, "The archive file")->required();
+  extractCommand->add_option("NAME", extract.patterns,
+                             "Entry names or patterns (* any run, ? one character, no case; "
+                             "'/' or '\\' between folders; a folder selects what lies below it)");
+  extractCommand->add_option("-o,--output", extract.outputDir,
+                             "Folder to write into, made when missing (default: .)");
+  extractCommand->add_flag("--overwrite", extract.overwrite, "Replace files that already exist");
+  extractCommand->add_flag("-q,--quiet", extract.quiet, "Report problems only");
+
+  std::vector<std::string> detectFiles;
+  CLI::App* detect = app.add_subcommand("detect", "Tell the format of each file, or \"unknown\"");
+  detect->add_option("FILE", detectFiles, "Files to recognise")->required();
+
+  CLI::App* formats = app.add_subcommand("formats", "List all known formats");
+
+  if (argc <= 1) {
+    fmt::print("{}", app.help());
+    return kExitUsage;
+  }
+  try {
+    app.parse(argc, argv);
+  } catch (const CLI::ParseError& e) {
+    if (e.get_exit_code() == 0) return app.exit(e);  // --help, --version
+    fmt::print(stderr, "cairn: {} (see cairn --help)\n", e.what());
+    return kExitUsage;
+  }
+
+  try {
+    if (list->parsed()) return ListCommand(listArchive);
+    if (extractCommand->parsed()) return ExtractCommand(extract);
+    if (detect->parsed()) return DetectCommand(detectFiles);
+    if (formats->parsed()) return FormatsCommand();
+  } catch (const std::exception& e) {
+    fmt::print(stderr, "cairn: {}\n", e.what());
+    return kExitFailed;
+  }
+  return kExitUsage;
+}

@@ -1,0 +1,345 @@
+#include "cli/commands.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <csignal>
+#include <cstdint>
+#include <cstdio>
+#include <exception>
+#include <filesystem>
+#include <optional>
+#include <random>
+#include <string_view>
+#include <system_error>
+
+#include "cli/names.h"
+#include "detect/detect.h"
+#include "plugin/extract.h"
+#include "plugin/registry.h"
+#include "plugin/session.h"
+
+namespace cairn::cli {
+namespace {
+
+namespace fs = std::filesystem;
+
+void Say(std::string_view file, std::string_view reason) {
+  fmt::print(stderr, "cairn: {}: {}\n", Printable(file), reason);
+}
+
+void Say(std::string_view file, std::string_view entry, std::string_view reason) {
+  fmt::print(stderr, "cairn: {}: {}: {}\n", Printable(file), Printable(entry), reason);
+}
+
+// What recognition answers for the file at `path`: nothing when the file
+// cannot be opened; 0 when it is shorter than a header or nothing matches.
+std::optional<FormatId> Recognise(const std::string& path) {
+  File file(os::OpenShared(path.c_str()));
+  if (!file) return std::nullopt;
+  std::vector<uint8_t> header(kHeaderSize, 0);
+  if (!ReadAt(file.get(), header.data(), 0, kHeaderSize)) return FormatId{0};
+  try {
+    const FormatId id = DetectFormat(ByteView(header), path, file.get());
+    return FindFormat(id) != nullptr ? id : 0;
+  } catch (const std::exception&) {
+    return FormatId{0};
+  }
+}
+
+std::string CannotOpen(const std::string& path) {
+  std::error_code ec;
+  const fs::file_status st = fs::status(path, ec);
+  if (!fs::exists(st)) return "cannot open: no such file";
+  if (fs::is_directory(st)) return "cannot open: it is a folder";
+  if (!fs::is_regular_file(st)) return "cannot open: not a regular file";
+  return "cannot open";
+}
+
+std::string OpenFailure(const std::string& path, int code) {
+  switch (code) {
+    case kBadData:
+      return "damaged or inconsistent directory";
+    case kUnknownFormat: {
+      // Recognition may know the format even though its reader is missing.
+      const std::optional<FormatId> id = Recognise(path);
+      const FormatInfo* info = id ? FindFormat(*id) : nullptr;
+      if (info != nullptr && info->reader == nullptr)
+        return fmt::format("recognised as format {} ({}), which cannot be read yet", info->id,
+                           info->shortName);
+      return "not a recognised archive";
+    }
+    case kOpenFailed:
+      return CannotOpen(path);
+    case kReadFailed:
+      return "too short or unreadable";
+    default:
+      return "cannot be read";
+  }
+}
+
+std::string_view ExtractFailure(int code) {
+  switch (code) {
+    case kBadData:
+      return "damaged entry data";
+    case kCreateFailed:
+      return "cannot create";
+    case kAborted:
+      return "stopped";
+    default:
+      return "cannot be extracted";
+  }
+}
+
+bool OpenOrSay(ArchiveSession& s, const std::string& path) {
+  const int result = OpenArchiveSession(s, path);
+  if (result == kOk) return true;
+  Say(path, OpenFailure(path, result));
+  return false;
+}
+
+size_t Digits(uint64_t n) {
+  return fmt::formatted_size("{}", n);
+}
+
+// Ctrl-C while extracting makes the progress callback ask the core to stop:
+// the half-written entry is removed and the tool ends.
+volatile std::sig_atomic_t gStopRequested = 0;
+
+extern "C" void RequestStop(int) {
+  gStopRequested = 1;
+}
+
+struct InterruptGuard {
+  using Handler = void (*)(int);
+  Handler previous;
+  InterruptGuard() : previous(std::signal(SIGINT, RequestStop)) { gStopRequested = 0; }
+  ~InterruptGuard() { std::signal(SIGINT, previous == SIG_ERR ? SIG_DFL : previous); }
+  InterruptGuard(const InterruptGuard&) = delete;
+  InterruptGuard& operator=(const InterruptGuard&) = delete;
+};
+
+// Makes the folders of `parts` below `root` and answers the path of the file
+// itself. Nothing is created through a symbolic link below the root: an entry
+// whose way down meets one is refused.
+std::optional<fs::path> PrepareTarget(const fs::path& root, const std::vector<std::string>& parts,
+                                      bool overwrite, std::string& why) {
+  fs::path at = root;
+  std::string shown;
+  for (size_t i = 0; i + 1 < parts.size(); ++i) {
+    at /= parts[i];
+    shown += parts[i];
+    std::error_code ec;
+    const fs::file_status st = fs::symlink_status(at, ec);
+    if (fs::is_symlink(st)) {
+      why =
+          fmt::format("refused: \"{}\" in the output folder is a symbolic link", Printable(shown));
+      return std::nullopt;
+    }
+    if (!fs::exists(st)) {
+      fs::create_directory(at, ec);
+      if (ec) {
+        why = fmt::format("cannot create the folder \"{}\"", Printable(shown));
+        return std::nullopt;
+      }
+    } else if (!fs::is_directory(st)) {
+      why = fmt::format("cannot create: \"{}\" is a file, not a folder", Printable(shown));
+      return std::nullopt;
+    }
+    shown += '/';
+  }
+  fs::path target = at / parts.back();
+  std::error_code ec;
+  const fs::file_status st = fs::symlink_status(target, ec);
+  if (fs::exists(st) || fs::is_symlink(st)) {
+    if (fs::is_directory(st)) {
+      why = "cannot create: a folder of that name exists";
+      return std::nullopt;
+    }
+    if (!overwrite) {
+      why = "already exists (use --overwrite to replace it)";
+      return std::nullopt;
+    }
+  }
+  return target;
+}
+
+// Creates an empty file of a fresh name in `folder`. The exclusive create
+// never opens an existing name, a symbolic link included.
+std::optional<fs::path> CreateScratch(const fs::path& folder) {
+  static const unsigned tag = std::random_device{}();
+  static unsigned counter = 0;
+  for (int attempt = 0; attempt < 100; ++attempt) {
+    fs::path p = folder / fmt::format(".cairn-{:08x}-{}.part", tag, counter++);
+    if (std::FILE* f = std::fopen(p.string().c_str(), "wbx")) {
+      std::fclose(f);
+      return p;
+    }
+    if (errno != EEXIST) break;
+  }
+  return std::nullopt;
+}
+
+enum class Outcome { Done, Failed, Stopped };
+
+// Writes entry `index` below `root`. The entry goes to a scratch file beside
+// its place first and is renamed over it only when complete, so that a
+// failed extraction leaves an existing file as it was.
+Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const ExtractOptions& o,
+                   std::string& shown) {
+  const std::string name = s.entries[index].Name;
+  const RelativeName rel = SplitEntryName(name);
+  if (rel.parts.empty()) {
+    Say(o.archive, name, "refused: " + rel.refusal);
+    return Outcome::Failed;
+  }
+  std::string why;
+  const std::optional<fs::path> target = PrepareTarget(root, rel.parts, o.overwrite, why);
+  if (!target) {
+    Say(o.archive, name, why);
+    return Outcome::Failed;
+  }
+  const std::optional<fs::path> scratch = CreateScratch(target->parent_path());
+  if (!scratch) {
+    Say(o.archive, name, "cannot create");
+    return Outcome::Failed;
+  }
+  const int result = ExtractEntry(s, index, scratch->string());
+  std::error_code ec;
+  if (result == kOk) {
+    fs::rename(*scratch, *target, ec);
+    if (!ec) {
+      shown.clear();
+      for (const std::string& part : rel.parts) shown += (shown.empty() ? "" : "/") + part;
+      return Outcome::Done;
+    }
+  }
+  fs::remove(*scratch, ec);
+  Say(o.archive, name, result == kOk ? "cannot create" : ExtractFailure(result));
+  return result == kAborted ? Outcome::Stopped : Outcome::Failed;
+}
+
+}  // namespace
+
+int ListCommand(const std::string& archive) {
+  ArchiveSession s;
+  if (!OpenOrSay(s, archive)) return kExitFailed;
+  uint64_t unpacked = 0, packed = 0;
+  for (const ArchiveEntry& e : s.entries) {
+    unpacked += e.UnpackedSize;
+    packed += e.PackedSize;
+  }
+  const FormatInfo* info = FindFormat(s.format);
+  fmt::print("Archive: {} (format {}, {})\n\n", Printable(archive), s.format,
+             info != nullptr ? info->shortName : "?");
+  const size_t w = std::max<size_t>({8, Digits(unpacked), Digits(packed)});
+  const std::string rule = fmt::format("{0:-<{1}}  {0:-<{1}}  ----\n", "", w);
+  fmt::print("{:>{}}  {:>{}}  Name\n{}", "Size", w, "Packed", w, rule);
+  for (const ArchiveEntry& e : s.entries)
+    fmt::print("{:>{}}  {:>{}}  {}\n", e.UnpackedSize, w, e.PackedSize, w, Printable(e.Name));
+  const size_t n = s.entries.size();
+  fmt::print("{}{:>{}}  {:>{}}  {} {}\n", rule, unpacked, w, packed, w, n,
+             n == 1 ? "entry" : "entries");
+  return kExitDone;
+}
+
+int ExtractCommand(const ExtractOptions& o) {
+  ArchiveSession s;
+  if (!OpenOrSay(s, o.archive)) return kExitFailed;
+
+  std::vector<size_t> chosen;
+  std::vector<bool> used(o.patterns.size(), false);
+  for (size_t i = 0; i < s.entries.size(); ++i) {
+    bool take = o.patterns.empty();
+    for (size_t p = 0; p < o.patterns.size(); ++p) {
+      if (MatchesEntry(o.patterns[p], s.entries[i].Name)) {
+        take = true;
+        used[p] = true;
+      }
+    }
+    if (take) chosen.push_back(i);
+  }
+  bool unmatched = false;
+  for (size_t p = 0; p < o.patterns.size(); ++p) {
+    if (!used[p]) {
+      Say(o.archive, fmt::format("no entry matches \"{}\"", Printable(o.patterns[p])));
+      unmatched = true;
+    }
+  }
+
+  const fs::path root(o.outputDir);
+  std::error_code ec;
+  fs::create_directories(root, ec);
+  if (!fs::is_directory(root, ec)) {
+    Say(o.outputDir, "cannot create the output folder");
+    return kExitFailed;
+  }
+
+  InterruptGuard guard;
+  s.progress = [](const std::string&, uint32_t) { return gStopRequested ? 0 : 1; };
+  size_t done = 0, failed = 0;
+  for (size_t index : chosen) {
+    if (gStopRequested) {
+      Say(o.archive, "stopped");
+      return kExitStopped;
+    }
+    std::string shown;
+    switch (ExtractOne(s, index, root, o, shown)) {
+      case Outcome::Done:
+        ++done;
+        if (!o.quiet) fmt::print("  extracted: {}\n", Printable(shown));
+        break;
+      case Outcome::Failed:
+        ++failed;
+        break;
+      case Outcome::Stopped:
+        return kExitStopped;
+    }
+  }
+  if (!o.quiet) {
+    if (failed == 0)
+      fmt::print("{} {} extracted to {}\n", done, done == 1 ? "entry" : "entries",
+                 Printable(o.outputDir));
+    else
+      fmt::print("{} of {} entries extracted to {}, {} failed\n", done, chosen.size(),
+                 Printable(o.outputDir), failed);
+  }
+  return failed > 0 || unmatched ? kExitPartial : kExitDone;
+}
+
+int DetectCommand(const std::vector<std::string>& files) {
+  int status = kExitDone;
+  for (const std::string& path : files) {
+    const std::optional<FormatId> id = Recognise(path);
+    if (!id) {
+      Say(path, CannotOpen(path));
+      status = kExitFailed;
+      continue;
+    }
+    const FormatInfo* info = FindFormat(*id);
+    if (info == nullptr)
+      fmt::print("{}: unknown\n", Printable(path));
+    else
+      fmt::print("{}: {} {}{}\n", Printable(path), info->id, info->shortName,
+                 info->reader == nullptr ? " (not readable yet)" : "");
+  }
+  return status;
+}
+
+int FormatsCommand() {
+  size_t w = 4;
+  size_t readable = 0;
+  for (const FormatInfo& f : AllFormats()) {
+    w = std::max(w, std::string_view(f.shortName).size());
+    if (f.reader != nullptr) ++readable;
+  }
+  fmt::print("{:>3}  {:<{}}  {:<8}  {}\n", "Id", "Name", w, "Readable", "Description");
+  for (const FormatInfo& f : AllFormats())
+    fmt::print("{:>3}  {:<{}}  {:<8}  {}\n", f.id, f.shortName, w, f.reader ? "yes" : "no",
+               f.description);
+  fmt::print("{} formats, {} readable\n", AllFormats().size(), readable);
+  return kExitDone;
+}
+
+}  // namespace cairn::cli

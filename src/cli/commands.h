@@ -1,0 +1,34 @@
+// The four commands of the `cairn` tool. Each prints its result on standard
+// output, one line per problem on standard error ("cairn: FILE: reason"), and
+// answers the process exit status.
+#pragma once
+
+#include <string>
+#include <vector>
+
+namespace cairn::cli {
+
+enum ExitStatus : int {
+  kExitDone = 0,
+  kExitFailed = 1,     // an archive or file could not be opened, read or recognised
+  kExitUsage = 2,      // the command line was not understood
+  kExitPartial = 3,    // some entries were not extracted, or a pattern matched nothing
+  kExitStopped = 130,  // interrupted; the entry being written was removed
+};
+
+int ListCommand(const std::string& archive);
+
+struct ExtractOptions {
+  std::string archive;
+  std::string outputDir = ".";
+  std::vector<std::string> patterns;  // none: every entry
+  bool overwrite = false;
+  bool quiet = false;
+};
+int ExtractCommand(const ExtractOptions& options);
+
+int DetectCommand(const std::vector<std::string>& files);
+
+int FormatsCommand();
+
+}  // namespace cairn::cli

@@ -52,7 +52,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {38, "pvol", "\"PVOL\" archive", nullptr, 0, RawCopy},
     {39, "tr4", "\"TR4\" level file", nullptr, 0, TgaThenInflate},
     {40, "1xfg", "\"1XFG\" chunk file", nullptr, 0, TgaStored16},
-    {41, "gaba", "\"GABA\" sound archive", nullptr, 0, RawCopy},  // pending: WAV
+    {41, "gaba", "\"GABA\" sound archive", nullptr, 0, WavPcm16Short},
     {42, "dir2048", "directory of signature row 42", RecordTableReader, 10, RawCopy},
     {43, "h4campaign", "\"H4CAMPAIGN\" wrapper", SingleEntryReader, 3, RawCopy},
     {44, "h4r", "\"H4R\" archive", nullptr, 0, RawCopy},
@@ -113,7 +113,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {99, "pal512", "named 512 x 512 palette image", nullptr, 0, BmpFixedLayout},
     {100, "pal256", "named 512 x 256 palette image", nullptr, 0, BmpFixedLayout},
     {101, "xormp3", "XOR-scrambled sound file", SingleEntryReader, 0, RawCopy},
-    {102, "offsound", "offset-list sound bank", nullptr, 0, RawCopy},  // pending: WAV
+    {102, "offsound", "offset-list sound bank", nullptr, 0, WavPcm8},
     {103, "nametable", "name table at file start", nullptr, 0, RawCopy},
     {104, "dir36", "36-byte-name directory with raw pictures", nullptr, 0, BmpWithColourTable},
     {105, "dir14", "14-byte-name directory with 16-bit count", RecordTableReader, 9, RawCopy},
@@ -137,12 +137,12 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {123, "bundle3", "three-section texture bundle", nullptr, 0, RawCopy},  // pending: DDS
     {124, "bundlepal", "texture bundle with leading block and separate palettes", nullptr, 0, RawCopy},  // pending: DDS
     {125, "qfs", "compressed stream with a 5- or 8-byte header", nullptr, 0, RawCopy},  // pending: OLZ
-    {126, "bag", "sound bank with .idx companion", nullptr, 0, RawCopy},  // pending: WAV
+    {126, "bag", "sound bank with .idx companion", nullptr, 0, WavPcm16},
     {127, "frame", "frame block stream", nullptr, 0, RawOrInflate},
     {128, "sequence12", "sequence block stream with 12-byte header", nullptr, 0, RawOrInflate},
     {129, "sequence", "sequence block stream without header", nullptr, 0, RawOrInflate},
     {130, "rec16", "unnamed 16-byte record directory", nullptr, 0, RawCopy},
-    {131, "syj", "JPEG stream with a game extension", nullptr, 0, RawCopy},  // pending: JPEG prefix
+    {131, "syj", "JPEG stream with a game extension", nullptr, 0, JpegPrefix},
     {132, "bigf-be", "big-endian directory", nullptr, 0, RawCopy},
     {133, "bigf-names", "name directory with data after it", nullptr, 0, RawCopy},
     {134, "r555", "headerless 16-bit picture", nullptr, 0, TgaStored},

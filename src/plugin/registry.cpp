@@ -90,7 +90,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {76, "pklist", "\"PK\" header list", nullptr, 0, Inflate},
     {77, "lgr", "23-byte-header file chain", nullptr, 0, RawCopy},
     {78, "img", "named palette picture", nullptr, 0, TgaLeadingPalette},
-    {79, "vtf", "texture with mip chain", nullptr, 0, RawCopy},  // pending: DDS
+    {79, "vtf", "texture with mip chain", nullptr, 0, DdsStored},
     {80, "sheets", "unnamed sheet archive with nested recognition", nullptr, 0, RawCopy},
     {81, "imglist-table", "image list behind a located table", nullptr, 0, RawCopy},
     {82, "imglist32", "image list after a 32-byte header", nullptr, 0, RawCopy},
@@ -134,8 +134,8 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {120, "tex512", "packed 512 x 256 texture", nullptr, 0, TgaThenInflate},
     {121, "pakdir", "archive with an interleaved-name .dir companion index", nullptr, 0, RawOrInflate},
     {122, "dir52", "size-prefixed 52-byte-name directory", FieldTableReader, 4, RawCopy},
-    {123, "bundle3", "three-section texture bundle", nullptr, 0, RawCopy},  // pending: DDS
-    {124, "bundlepal", "texture bundle with leading block and separate palettes", nullptr, 0, RawCopy},  // pending: DDS
+    {123, "bundle3", "three-section texture bundle", nullptr, 0, DdsMaybeCoded},
+    {124, "bundlepal", "texture bundle with leading block and separate palettes", nullptr, 0, DdsStored},
     {125, "qfs", "compressed stream with a 5- or 8-byte header", nullptr, 0, RawCopy},  // pending: OLZ
     {126, "bag", "sound bank with .idx companion", nullptr, 0, WavPcm16},
     {127, "frame", "frame block stream", nullptr, 0, RawOrInflate},
@@ -168,7 +168,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {154, "psc", "key-scrambled size chain", nullptr, 0, RawCopy},
     {155, "iff", "wrapped IFF file", SingleEntryReader, 8, IlbmPrefix},
     {156, "meg", "name list with indexed records", nullptr, 0, RawCopy},
-    {157, "bundlelead", "texture bundle with leading block", nullptr, 0, RawCopy},  // pending: DDS
+    {157, "bundlelead", "texture bundle with leading block", nullptr, 0, DdsStored},
 }};
 
 }  // namespace

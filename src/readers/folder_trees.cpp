@@ -77,10 +77,12 @@ void TypedTableReader(ReaderContext& c, unsigned) {
     count += types.u32le(uint64_t{t} * 12 + 8);
     if (count > c.fileSize / 12) throw BadData("more entries than the file holds");
   }
-  const std::vector<uint8_t> recordBlock = ReadBlock(c, 64 + uint64_t{typeCount} * 12, count * 12);
-  const ByteView records(recordBlock);
-  c.entries.reserve(static_cast<size_t>(count));
-  uint64_t at = 0;
+  // The records are plain fixed records (a 4-byte name that is not used, the
+  // offset, the size); the names come from the types.
+  const size_t first = c.entries.size();
+  ReadRecordDirectory(c, 64 + uint64_t{typeCount} * 12, static_cast<uint32_t>(count),
+                      {4, 4, 4, false});
+  size_t e = first;
   for (uint32_t t = 0; t < typeCount; ++t) {
     // The tag is stored back to front after one byte of padding: " pmb" is
     // ".bmp". Like any name, the extension ends at a zero byte.
@@ -88,10 +90,10 @@ void TypedTableReader(ReaderContext& c, unsigned) {
     std::string extension = ".";
     for (int i = 3; i >= 1 && tag.u8(i) != 0; --i) extension += static_cast<char>(tag.u8(i));
     const uint32_t n = types.u32le(uint64_t{t} * 12 + 8);
-    for (uint32_t i = 0; i < n; ++i, at += 12) {
-      const uint32_t size = records.u32le(at + 8);
-      AddEntry(c, NumberedName(c.archiveFileName, i) + extension, records.u32le(at + 4), size,
-               size);
+    for (uint32_t i = 0; i < n; ++i, ++e) {
+      std::string name = NumberedName(c.archiveFileName, i) + extension;
+      if (name.size() > kMaxNameLength) throw BadData("name too long");
+      c.entries[e].Name = std::move(name);
     }
   }
 }

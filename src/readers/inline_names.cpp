@@ -2,7 +2,8 @@
 // and size. All entries are stored as they are.
 //
 // Counted arrays of equal records, each a fixed-width name field, an offset
-// and a size (NamedRecordReader, one row per shape):
+// and a size (NamedRecordReader, one row per shape; the first two are the
+// fixed-record reader given their layouts):
 //   "MHX XS V1.0"  64-byte records from file offset 64; the header word at 48
 //                  is the end of the directory region, 448 bytes past the
 //                  end of the records: name[48], offset, size, 8 spare bytes.
@@ -41,61 +42,6 @@
 namespace cairn {
 namespace {
 
-// Where a counted array of equal records lies and how one record reads.
-struct NamedRecords {
-  uint64_t directory = 0;  // file offset
-  uint64_t size = 0;       // bytes read from there
-  uint64_t count = 0;
-  uint32_t stride = 0;
-  uint32_t nameAt = 0, nameWidth = 0, offsetAt = 0, sizeAt = 0;
-};
-
-NamedRecords MhxRecords(const ReaderContext& c) {
-  NamedRecords r;
-  r.directory = 64;
-  r.size = static_cast<uint32_t>(c.header.u32le(48) - 448);
-  r.count = r.size / 64;
-  r.stride = 64;
-  r.nameWidth = 48;
-  r.offsetAt = 48;
-  r.sizeAt = 52;
-  return r;
-}
-
-NamedRecords MageGoldRecords(const ReaderContext& c) {
-  NamedRecords r;
-  r.directory = c.header.u32le(40);
-  r.size = c.header.u32le(44);
-  r.count = r.size / 64;
-  r.stride = 64;
-  r.nameWidth = 56;
-  r.offsetAt = 56;
-  r.sizeAt = 60;
-  return r;
-}
-
-NamedRecords PffRecords(const ReaderContext& c) {
-  NamedRecords r;
-  r.count = c.header.u32le(8);
-  r.stride = c.header.u32le(12);
-  // A record shorter than its four fixed words has no room for a name.
-  if (r.stride < 16) throw BadData("record too short for a name");
-  r.directory = c.header.u32le(16);
-  r.size = r.count * r.stride;
-  r.nameAt = 16;
-  r.nameWidth = r.stride - 16;
-  r.offsetAt = 4;
-  r.sizeAt = 8;
-  return r;
-}
-
-using NamedRecordLayout = NamedRecords (*)(const ReaderContext&);
-constexpr std::array<NamedRecordLayout, 3> kNamedRecordLayouts = {
-    MhxRecords,
-    MageGoldRecords,
-    PffRecords,
-};
-
 // The 32-bit word stored in the archive at `position`.
 uint32_t WordAt(const ReaderContext& c, uint64_t position) {
   return ByteView(ReadBlock(c, position, 4)).u32le(0);
@@ -104,16 +50,29 @@ uint32_t WordAt(const ReaderContext& c, uint64_t position) {
 }  // namespace
 
 void NamedRecordReader(ReaderContext& c, unsigned row) {
-  const NamedRecords r = kNamedRecordLayouts.at(row)(c);
-  // Every row's count fills at most its directory, which must lie inside the
-  // file: the table is bounded by the file size.
-  const std::vector<uint8_t> block = ReadBlock(c, r.directory, r.size);
-  const ByteView dir(block);
-  c.entries.reserve(static_cast<size_t>(r.count));
-  for (uint64_t i = 0; i < r.count; ++i) {
-    const ByteView record = dir.sub(i * r.stride, r.stride);
-    const uint32_t size = record.u32le(r.sizeAt);
-    AddEntry(c, record.field(r.nameAt, r.nameWidth), record.u32le(r.offsetAt), size, size);
+  switch (row) {
+    case 0: {  // "MHX XS V1.0": the directory region ends 448 bytes past the records
+      const uint32_t size = c.header.u32le(48) - 448;
+      ReadRecordDirectory(c, 64, size / 64, {48, 4, 12, false});
+      return;
+    }
+    case 1:  // "MageGold"
+      ReadRecordDirectory(c, c.header.u32le(40), c.header.u32le(44) / 64, {56, 4, 4, false});
+      return;
+    default: {  // "PFF2", "PFF3": the name fills the record after its four words
+      const uint32_t count = c.header.u32le(8);
+      const uint32_t stride = c.header.u32le(12);
+      if (stride < 16) throw BadData("record too short for a name");
+      const std::vector<uint8_t> block =
+          ReadBlock(c, c.header.u32le(16), uint64_t{count} * stride);
+      const ByteView dir(block);
+      c.entries.reserve(count);
+      for (uint64_t i = 0; i < count; ++i) {
+        const ByteView record = dir.sub(i * stride, stride);
+        const uint32_t size = record.u32le(8);
+        AddEntry(c, record.field(16, stride - 16), record.u32le(4), size, size);
+      }
+    }
   }
 }
 

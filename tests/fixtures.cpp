@@ -43,6 +43,7 @@ TEST(Fixtures, EachListsAndExtractsThroughRecognition) {
 TEST(Fixtures, DumpWhenAsked) {
   const char* root = std::getenv("CAIRN_DUMP_FIXTURES");
   if (root == nullptr) GTEST_SKIP() << "CAIRN_DUMP_FIXTURES is not set";
+  std::filesystem::create_directories(root);
   std::ofstream list(std::filesystem::path(root) / "list.txt");
   int n = 0;
   for (const Fixture& f : AllFixtures()) {

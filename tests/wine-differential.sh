@@ -11,6 +11,7 @@ linux=$(realpath "$1")
 windows=$(realpath "$2")
 wine=$(command -v wine64 || echo /usr/lib/wine/wine64)
 export WINEDEBUG=-all WINEPREFIX=${WINEPREFIX:-$HOME/.cache/cairn-wine}
+mkdir -p "$(dirname "$WINEPREFIX")"
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 
@@ -19,7 +20,6 @@ winpath() { echo "Z:$1" | sed 's|/|\\|g'; }
 
 CAIRN_DUMP_FIXTURES="$work/fx" "$linux/tests/cairn_tests" --gtest_filter=Fixtures.DumpWhenAsked >/dev/null \
   || fail "could not write the fixtures"
-mkdir -p "$work/fx"
 archives=(); winarchives=()
 while read -r n name; do
   archives+=("$work/fx/$n/$name")
@@ -45,11 +45,10 @@ echo "same listings and bytes: ${#archives[@]} archives, $entries entries, wide 
 # A path outside the ANSI code page opens and extracts through the wide entry points.
 unicode="$work/ünïcödé-архив-档案"
 mkdir -p "$unicode"
-cp "${archives[0]}" "$unicode/"
+cp -p "${archives[0]}" "$unicode/"
 base=$(basename "${archives[0]}")
 "$wine" "$windows/wcx_host.exe" "$windows/cairn.wcx64" "$(winpath "$work/uni")" \
   "$(winpath "$unicode/$base")" | tr -d '\r' > "$work/uni.txt"
-head -1 "$work/linux.txt" > "$work/first.txt"
 awk '/^archive 1 /{exit} {print}' "$work/linux.txt" > "$work/first.txt"
 diff -u "$work/first.txt" "$work/uni.txt" || fail "the path outside the code page reads differently"
 diff -r "$work/linux/0" "$work/uni/0" || fail "the path outside the code page extracts differently"

@@ -128,8 +128,8 @@ TEST(TextureArchives, EachFormatListsAndExtractsExactly) {
   ExpectSample(kPackDirectory, PackSample());
 }
 
-// Needs the TGA method for FormatIds 4, 5 and 70.
-TEST(TextureArchives, DISABLED_PendingTgaCopiesExtract) {
+// The TGA copies of all three extract through their palettes.
+TEST(TextureArchives, TgaCopiesExtract) {
   ExpectSample(kWad2, Wad2Sample(), true);
   ExpectSample(kWad3, Wad3Sample(), true);
   ExpectSample(kPackDirectory, PackSample(), true);

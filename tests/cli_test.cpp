@@ -16,6 +16,7 @@
 #include <vector>
 
 #include "builder.h"
+#include "detect_fixtures.h"
 #include "fixtures.h"
 #include "plugin/registry.h"
 
@@ -406,6 +407,28 @@ TEST(Cli, DetectAnswersTheFormatOrUnknown) {
 
   const ToolRun ok = Cairn({"detect", text});
   EXPECT_EQ(ok.status, 0);
+}
+
+// One file of every format that recognition can reach, each in a folder of
+// its own with its companions: detect names its FormatId and short name.
+TEST(Cli, DetectRecognisesEveryReachableFormat) {
+  TempDir dir;
+  std::vector<std::string> args = {"detect"};
+  std::string expected;
+  int n = 0;
+  for (const DetectCase& c : DetectCases()) {
+    const std::string folder = "case" + std::to_string(n++) + "/";
+    for (const auto& [name, bytes] : c.companions) dir.write(folder + name, bytes);
+    const std::string path = dir.write(folder + c.fileName, c.bytes);
+    args.push_back(path);
+    const FormatInfo* info = FindFormat(c.id);
+    expected += path + ": " + std::to_string(c.id) + " " + info->shortName +
+                (info->reader == nullptr ? " (not readable yet)" : "") + "\n";
+  }
+  EXPECT_EQ(n, 154);
+  const ToolRun r = Cairn(args);
+  EXPECT_EQ(r.status, 0);
+  EXPECT_EQ(r.out, expected);
 }
 
 TEST(Cli, FormatsListsAllFormatsWithTheirReadability) {

@@ -20,42 +20,25 @@ namespace cairn::test {
 
 // An archive of one FormatId whose entries the test lists itself.
 struct MediaArchive {
-  TempDir dir;
-  ArchiveSession session;
+  std::unique_ptr<Opened> opened;
+  TempDir& dir;
 
-  MediaArchive(FormatId format, const Bytes& bytes, std::string_view fileName = "archive.bin") {
-    const std::string path = dir.write(fileName, bytes);
-    session.format = format;
-    session.path = path;
-    session.archive = File(os::OpenShared(path.c_str()));
-  }
+  MediaArchive(FormatId format, const Bytes& bytes)
+      : opened(SessionOver(format, bytes, {})), dir(opened->dir) {}
 
   MediaArchive& add(std::string name, uint32_t offset, uint32_t unpacked, uint32_t packed,
                     uint32_t extra, uint8_t flag) {
-    session.entries.push_back({std::move(name), offset, unpacked, packed, extra, flag});
+    opened->session.entries.push_back({std::move(name), offset, unpacked, packed, extra, flag});
     return *this;
   }
 
   // Extracts entry `index` to a file that stays until the archive goes;
   // answers the result code.
   int extractTo(size_t index, const std::string& path) {
-    return ExtractEntry(session, index, path);
+    return ExtractEntry(opened->session, index, path);
   }
-
-  int extract(size_t index, Bytes& out) {
-    const std::string dest = dir.path("out-" + std::to_string(index));
-    const int r = ExtractEntry(session, index, dest);
-    out = r == kOk ? ReadFile(dest) : Bytes{};
-    if (r != kOk) EXPECT_FALSE(Exists(dest)) << "output left behind after " << r;
-    std::filesystem::remove(dest);
-    return r;
-  }
-
-  Bytes extract(size_t index) {
-    Bytes out;
-    EXPECT_EQ(extract(index, out), kOk) << "entry " << index;
-    return out;
-  }
+  int extract(size_t index, Bytes& out) { return opened->extract(index, out); }
+  Bytes extract(size_t index) { return opened->extract(index); }
 };
 
 inline bool HaveTool(const char* name) {

@@ -120,5 +120,26 @@ TEST(Jdlz, RoundTripsGeneratedData) {
   }
 }
 
+TEST(Jdlz, ExtractsEntriesThroughTheFrame) {
+  const Bytes good = {0x02, 0x01, 'a', 0x00, 0x07};
+  const Bytes bad = {0x01, 0x01, 0x00, 0x00};
+  const Bytes archive = ArchiveBuilder().text("JDLZhead").bytes(good).bytes(bad).text("tail").get();
+  auto o = OpenWithEntries(50, archive,
+                           {
+                               {"a.bin", 8, 11, 5},
+                               {"short.bin", 8, 14, 5},  // ends early: zeros follow
+                               {"bad.bin", 13, 3, 4},
+                               {"past.bin", 13, 3, 9},  // stored bytes run past the end
+                           });
+  ASSERT_EQ(o->result, kOk);
+  EXPECT_EQ(o->extract(0), Bytes(11, 'a'));
+  Bytes want(11, 'a');
+  want.resize(14, 0);
+  EXPECT_EQ(o->extract(1), want);
+  Bytes out;
+  EXPECT_EQ(o->extract(2, out), kBadData);
+  EXPECT_EQ(o->extract(3, out), kBadData);
+}
+
 }  // namespace
 }  // namespace cairn::test

@@ -147,5 +147,20 @@ TEST(OpcodeLz, RoundTripsGeneratedData) {
   }
 }
 
+TEST(OpcodeLz, ExtractsEntriesThroughTheFrame) {
+  const Bytes archive = ArchiveBuilder().text("QFS\x10\xFB").bytes({0x01, 0x00, 'a', 0xFC}).get();
+  auto o = OpenWithEntries(125, archive,
+                           {
+                               {"a.bin", 5, 4, 4},
+                               {"long.bin", 5, 5, 4},  // one byte short
+                               {"past.bin", 5, 4, 5},  // stored bytes run past the end
+                           });
+  ASSERT_EQ(o->result, kOk);
+  EXPECT_EQ(o->extract(0), Str("aaaa"));
+  Bytes out;
+  EXPECT_EQ(o->extract(1, out), kBadData);
+  EXPECT_EQ(o->extract(2, out), kBadData);
+}
+
 }  // namespace
 }  // namespace cairn::test

@@ -62,5 +62,75 @@ TEST(Rle, RoundTripsGeneratedData) {
   }
 }
 
+TEST(Rle, ExtractsEntriesThroughTheFrame) {
+  const Bytes archive = ArchiveBuilder()
+                            .text("PACK")
+                            .bytes({0x83, 'a', 'b', 'c', 0x04, 'z'})
+                            .bytes({0x05, 'a'})
+                            .get();
+  auto o = OpenWithEntries(7, archive,
+                           {
+                               {"a.bin", 4, 7, 6, 0, 1},  // the Flag does not matter
+                               {"long.bin", 4, 9, 6},     // zeros after the runs
+                               {"over.bin", 10, 4, 2},    // a run past the size
+                               {"past.bin", 10, 5, 3},    // stored bytes run past the end
+                           });
+  ASSERT_EQ(o->result, kOk);
+  EXPECT_EQ(o->extract(0), Str("abczzzz"));
+  EXPECT_EQ(o->extract(1), Bytes({'a', 'b', 'c', 'z', 'z', 'z', 'z', 0, 0}));
+  Bytes out;
+  EXPECT_EQ(o->extract(2, out), kBadData);
+  EXPECT_EQ(o->extract(3, out), kBadData);
+}
+
+// A block: its length L (data bytes + 1), three bytes nobody reads, the data.
+ArchiveBuilder& Block(ArchiveBuilder& b, std::string_view data) {
+  return b.u16(static_cast<uint16_t>(data.size() + 1)).u8(0xA1).u8(0xB2).u8(0xC3).text(data);
+}
+
+TEST(BlockJoin, JoinsBlocksUntilTheirLengthsReachPackedSize) {
+  ArchiveBuilder b;
+  b.text("ISD0");
+  Block(b, "");       // 4: L = 1
+  Block(b, "abc");    // 9: L = 4
+  Block(b, "de");     // 17: L = 3
+  Block(b, "fghi");   // 24: L = 5
+  Block(b, "never");  // 33: past every entry's PackedSize
+  auto o = OpenWithEntries(75, b.get(),
+                           {
+                               {"one.bin", 4, 0, 1},    // L = 1: nothing written
+                               {"two.bin", 9, 5, 7},    // 4 + 3: "abc" + "de"
+                               {"empty.bin", 9, 0, 0},  // no block read at all
+                               {"over.bin", 9, 5, 5},   // the block that passes 5 is whole
+                               {"chain.bin", 4, 9, 13, 0, 3},
+                           });
+  ASSERT_EQ(o->result, kOk);
+  EXPECT_EQ(o->extract(0), Bytes());
+  EXPECT_EQ(o->extract(1), Str("abcde"));
+  EXPECT_EQ(o->extract(2), Bytes());
+  EXPECT_EQ(o->extract(3), Str("abcde"));
+  EXPECT_EQ(o->extract(4), Str("abcdefghi"));
+}
+
+TEST(BlockJoin, FailsOnBadChains) {
+  ArchiveBuilder b;
+  b.text("ISD0");
+  Block(b, "abc");                         // 4
+  b.u16(0).u8(0).u8(0).u8(0);              // 12: L = 0
+  b.u16(40).u8(0).u8(0).u8(0).text("xy");  // 17: claims 39 data bytes; 9 follow
+  Block(b, "ok");                          // 24: ends the archive
+  auto o = OpenWithEntries(75, b.get(),
+                           {
+                               {"zero.bin", 4, 3, 5},
+                               {"short.bin", 17, 39, 40},
+                               {"noheader.bin", 24, 2, 6},  // wants a block after the end
+                           });
+  ASSERT_EQ(o->result, kOk);
+  Bytes out;
+  EXPECT_EQ(o->extract(0, out), kBadData);
+  EXPECT_EQ(o->extract(1, out), kBadData);
+  EXPECT_EQ(o->extract(2, out), kBadData);
+}
+
 }  // namespace
 }  // namespace cairn::test

@@ -18,7 +18,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {4, "wad2", "\"WAD2\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
     {5, "wad3", "\"WAD3\" texture archive", nullptr, 0, RawCopy},  // pending: TGA
     {6, "iwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
-    {7, "pack-rle", "\"PACK\" compressed file", nullptr, 0, RawCopy},  // pending: RLE
+    {7, "pack-rle", "\"PACK\" compressed file", nullptr, 0, RleMethod},
     {8, "paq", "\"paq\" archive", nullptr, 0, RawCopy},
     {9, "afs", "\"AFS\" archive", nullptr, 0, RawCopy},
     {10, "lod", "\"LOD\" archive", FieldTableReader, 0, Inflate},
@@ -61,7 +61,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {47, "avix", "\"AVIX\" picture file", nullptr, 0, RawCopy},  // pending: TGA
     {48, "nldir", "newline directory", nullptr, 0, RawCopy},
     {49, "palettefiles", "\"PALETTEFILES \" section file", nullptr, 0, RawCopy},
-    {50, "jdlz", "\"JDLZ\" compressed file", nullptr, 0, RawCopy},  // pending: JDLZ
+    {50, "jdlz", "\"JDLZ\" compressed file", nullptr, 0, JdlzMethod},
     {51, "bikwrap", "video wrapper of signature row 51", SingleEntryReader, 4, RawCopy},
     {52, "big", "\"BIG\" archive", nullptr, 0, RawCopy},
     {53, "_archive", "\"_ARCHIVE\" archive", nullptr, 0, RawOrInflate},
@@ -86,7 +86,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {72, "tex2", "\"TEX\" texture lists", nullptr, 0, RawCopy},  // pending: TGA
     {73, "xcr", "\"xcr File 1.00\" archive", FieldTableReader, 6, RawCopy},
     {74, "lp1c", "\"LP1C\" archive", nullptr, 0, RawCopy},
-    {75, "isd0", "\"ISD0\" enciphered record list", nullptr, 0, RawCopy},  // pending: BLK
+    {75, "isd0", "\"ISD0\" enciphered record list", nullptr, 0, BlockJoin},
     {76, "pklist", "\"PK\" header list", nullptr, 0, Inflate},
     {77, "lgr", "23-byte-header file chain", nullptr, 0, RawCopy},
     {78, "img", "named palette picture", nullptr, 0, RawCopy},  // pending: TGA
@@ -136,7 +136,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {122, "dir52", "size-prefixed 52-byte-name directory", FieldTableReader, 4, RawCopy},
     {123, "bundle3", "three-section texture bundle", nullptr, 0, RawCopy},  // pending: DDS
     {124, "bundlepal", "texture bundle with leading block and separate palettes", nullptr, 0, RawCopy},  // pending: DDS
-    {125, "qfs", "compressed stream with a 5- or 8-byte header", nullptr, 0, RawCopy},  // pending: OLZ
+    {125, "qfs", "compressed stream with a 5- or 8-byte header", nullptr, 0, OpcodeLzMethod},
     {126, "bag", "sound bank with .idx companion", nullptr, 0, RawCopy},  // pending: WAV
     {127, "frame", "frame block stream", nullptr, 0, RawOrInflate},
     {128, "sequence12", "sequence block stream with 12-byte header", nullptr, 0, RawOrInflate},

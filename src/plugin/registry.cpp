@@ -18,7 +18,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {4, "wad2", "\"WAD2\" texture archive", TextureArchiveReader, 0, TgaFromBuiltInPalette},
     {5, "wad3", "\"WAD3\" texture archive", TextureArchiveReader, 1, TgaFromTailPalette},
     {6, "iwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
-    {7, "pack-rle", "\"PACK\" compressed file", SingleStreamReader, 0, RawCopy},  // pending: RLE
+    {7, "pack-rle", "\"PACK\" compressed file", SingleStreamReader, 0, RleMethod},
     {8, "paq", "\"paq\" archive", ChainedItemReader, 0, RawCopy},
     {9, "afs", "\"AFS\" archive", NameBlockReader, 0, RawCopy},
     {10, "lod", "\"LOD\" archive", FieldTableReader, 0, Inflate},
@@ -50,7 +50,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {36, "objpkg", "object package", nullptr, 0, RawCopy},
     {37, "l33t", "\"l33t\" compressed file", SingleStreamReader, 2, Inflate},
     {38, "pvol", "\"PVOL\" archive", PvolReader, 0, RawCopy},
-    {39, "tr4", "\"TR4\" level file", nullptr, 0, TgaThenInflate},
+    {39, "tr4", "\"TR4\" level file", nullptr, 0, RawOrInflate},  // TGA header then inflate for Flag 2 and up
     {40, "1xfg", "\"1XFG\" chunk file", ChainedItemReader, 2, TgaStored16},
     {41, "gaba", "\"GABA\" sound archive", nullptr, 0, WavPcm16Short},
     {42, "dir2048", "directory of signature row 42", RecordTableReader, 10, RawCopy},
@@ -61,7 +61,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {47, "avix", "\"AVIX\" picture file", SingleStreamReader, 3, TgaStored},
     {48, "nldir", "newline directory", nullptr, 0, RawCopy},
     {49, "palettefiles", "\"PALETTEFILES \" section file", nullptr, 0, RawCopy},
-    {50, "jdlz", "\"JDLZ\" compressed file", SingleStreamReader, 4, RawCopy},  // pending: JDLZ
+    {50, "jdlz", "\"JDLZ\" compressed file", SingleStreamReader, 4, JdlzMethod},
     {51, "bikwrap", "video wrapper of signature row 51", SingleEntryReader, 4, RawCopy},
     {52, "big", "\"BIG\" archive", nullptr, 0, RawCopy},
     {53, "_archive", "\"_ARCHIVE\" archive", nullptr, 0, RawOrInflate},
@@ -86,7 +86,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {72, "tex2", "\"TEX\" texture lists", nullptr, 0, TgaStored},
     {73, "xcr", "\"xcr File 1.00\" archive", FieldTableReader, 6, RawCopy},
     {74, "lp1c", "\"LP1C\" archive", nullptr, 0, RawCopy},
-    {75, "isd0", "\"ISD0\" enciphered record list", nullptr, 0, RawCopy},  // pending: BLK
+    {75, "isd0", "\"ISD0\" enciphered record list", nullptr, 0, BlockJoin},
     {76, "pklist", "\"PK\" header list", nullptr, 0, Inflate},
     {77, "lgr", "23-byte-header file chain", nullptr, 0, RawCopy},
     {78, "img", "named palette picture", nullptr, 0, TgaLeadingPalette},
@@ -131,12 +131,12 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {117, "chain16", "unnamed 16-byte-header chain", nullptr, 0, Inflate},
     {118, "dir136", "136-byte-record directory", FieldTableReader, 3, RawCopy},
     {119, "psv", "space-terminated-name directory with description", nullptr, 0, RawCopy},
-    {120, "tex512", "packed 512 x 256 texture", nullptr, 0, TgaThenInflate},
+    {120, "tex512", "packed 512 x 256 texture", nullptr, 0, RawOrInflate},  // TGA header then inflate for Flag 2 and up
     {121, "pakdir", "archive with an interleaved-name .dir companion index", nullptr, 0, RawOrInflate},
     {122, "dir52", "size-prefixed 52-byte-name directory", FieldTableReader, 4, RawCopy},
     {123, "bundle3", "three-section texture bundle", nullptr, 0, DdsMaybeCoded},
     {124, "bundlepal", "texture bundle with leading block and separate palettes", nullptr, 0, DdsStored},
-    {125, "qfs", "compressed stream with a 5- or 8-byte header", nullptr, 0, RawCopy},  // pending: OLZ
+    {125, "qfs", "compressed stream with a 5- or 8-byte header", nullptr, 0, OpcodeLzMethod},
     {126, "bag", "sound bank with .idx companion", nullptr, 0, WavPcm16},
     {127, "frame", "frame block stream", nullptr, 0, RawOrInflate},
     {128, "sequence12", "sequence block stream with 12-byte header", nullptr, 0, RawOrInflate},

@@ -99,8 +99,8 @@ TEST(SingleStream, EachFormatListsAndExtractsExactly) {
   }
 }
 
-// Needs the run-length, TGA and "JDLZ" methods for FormatIds 7, 47 and 50.
-TEST(SingleStream, DISABLED_PendingStreamsDecode) {
+// The run-length, TGA and "JDLZ" streams of FormatIds 7, 47 and 50 decode.
+TEST(SingleStream, DecodedStreamsExtract) {
   ExpectSample(kPackRle, PackRleSample(), true);
   ExpectSample(kAvix, AvixSample(), true);
   ExpectSample(kJdlz, JdlzSample(), true);

@@ -50,7 +50,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {36, "objpkg", "object package", nullptr, 0, RawCopy},
     {37, "l33t", "\"l33t\" compressed file", SingleStreamReader, 2, Inflate},
     {38, "pvol", "\"PVOL\" archive", PvolReader, 0, RawCopy},
-    {39, "tr4", "\"TR4\" level file", nullptr, 0, RawOrInflate},  // TGA header then inflate for Flag 2 and up
+    {39, "tr4", "\"TR4\" level file", nullptr, 0, TgaThenInflate},
     {40, "1xfg", "\"1XFG\" chunk file", ChainedItemReader, 2, TgaStored16},
     {41, "gaba", "\"GABA\" sound archive", nullptr, 0, WavPcm16Short},
     {42, "dir2048", "directory of signature row 42", RecordTableReader, 10, RawCopy},
@@ -131,7 +131,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {117, "chain16", "unnamed 16-byte-header chain", nullptr, 0, Inflate},
     {118, "dir136", "136-byte-record directory", FieldTableReader, 3, RawCopy},
     {119, "psv", "space-terminated-name directory with description", nullptr, 0, RawCopy},
-    {120, "tex512", "packed 512 x 256 texture", nullptr, 0, RawOrInflate},  // TGA header then inflate for Flag 2 and up
+    {120, "tex512", "packed 512 x 256 texture", nullptr, 0, TgaThenInflate},
     {121, "pakdir", "archive with an interleaved-name .dir companion index", nullptr, 0, RawOrInflate},
     {122, "dir52", "size-prefixed 52-byte-name directory", FieldTableReader, 4, RawCopy},
     {123, "bundle3", "three-section texture bundle", nullptr, 0, DdsMaybeCoded},

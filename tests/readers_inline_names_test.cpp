@@ -235,6 +235,10 @@ TEST(InlineNames, RefusesBadDirectories) {
       {"MHX records past the end", kMhx, Padded(MhxHeader(448 + 2 * 64), 64 + 64 + 10)},
       {"MageGold directory past the end", kMageGold, Padded(MageGoldHeader(104, 64), 150)},
       {"MageGold directory offset wraps", kMageGold, Padded(MageGoldHeader(0xFFFFFFF0, 64), 150)},
+      // One whole record, then a partial one that the end of the file cuts.
+      {"MHX partial record past the end", kMhx, Padded(MhxHeader(448 + 64 + 32), 64 + 64 + 16)},
+      {"MageGold partial record past the end", kMageGold,
+       Padded(MageGoldHeader(104, 64 + 32), 104 + 64 + 16)},
       {"PFF record too short for a name", kPff3, Padded(PffHeader('3', 1, 15, 20), 120)},
       {"PFF count that cannot fit", kPff2, Padded(PffHeader('2', 0x10000000, 32, 20), 120)},
       {"PFF name of 260", kPff3, pffLong.get()},

@@ -47,18 +47,29 @@ uint32_t WordAt(const ReaderContext& c, uint64_t position) {
   return ByteView(ReadBlock(c, position, 4)).u32le(0);
 }
 
+// A directory stated by position and byte size must lie in the file as a
+// whole, a trailing partial record included, although only whole records are
+// listed.
+void NeedDirectoryInFile(const ReaderContext& c, uint64_t position, uint64_t size) {
+  if (position + size > c.fileSize) throw BadData("directory past the end");
+}
+
 }  // namespace
 
 void NamedRecordReader(ReaderContext& c, unsigned row) {
   switch (row) {
     case 0: {  // "MHX XS V1.0": the directory region ends 448 bytes past the records
       const uint32_t size = c.header.u32le(48) - 448;
+      NeedDirectoryInFile(c, 64, size);
       ReadRecordDirectory(c, 64, size / 64, {48, 4, 12, false});
       return;
     }
-    case 1:  // "MageGold"
-      ReadRecordDirectory(c, c.header.u32le(40), c.header.u32le(44) / 64, {56, 4, 4, false});
+    case 1: {  // "MageGold"
+      const uint32_t position = c.header.u32le(40), size = c.header.u32le(44);
+      NeedDirectoryInFile(c, position, size);
+      ReadRecordDirectory(c, position, size / 64, {56, 4, 4, false});
       return;
+    }
     default: {  // "PFF2", "PFF3": the name fills the record after its four words
       const uint32_t count = c.header.u32le(8);
       const uint32_t stride = c.header.u32le(12);

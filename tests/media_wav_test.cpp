@@ -84,7 +84,9 @@ TEST(PrefixMethods, JpegAndIlbmStarts) {
 
   // The picture's own first 16 bytes give way to the FORM start.
   MediaArchive iff(155, data);
-  iff.add("p.iff", 0, 0x1234, 0x1234, 0, 0).add("tiny", 0, 15, 15, 0, 0);
+  iff.add("p.iff", 0, 0x1234, 0x1234, 0, 0)
+      .add("tiny", 0, 15, 15, 0, 0)
+      .add("far", 0xFFFFFFF8u, 0x20, 0x20, 0, 0);
   const Bytes ilbm = iff.extract(0);
   EXPECT_EQ(Slice(ilbm, 0, 16),
             (ArchiveBuilder().text("FORM").u8(0).u8(0).u8(0x12).u8(0x2C).text("ILBMBMHD").get()));
@@ -92,6 +94,8 @@ TEST(PrefixMethods, JpegAndIlbmStarts) {
   EXPECT_EQ(iff.extract(0), ilbm);
   Bytes out;
   EXPECT_EQ(iff.extract(1, out), kBadData);
+  // Data past the end of the archive is refused, not read from its start.
+  EXPECT_EQ(iff.extract(2, out), kBadData);
 }
 
 // ---- A real decoder reads what was written --------------------------------

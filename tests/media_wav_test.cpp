@@ -82,16 +82,27 @@ TEST(PrefixMethods, JpegAndIlbmStarts) {
   jpg.add("photo01.jpg", 0, 0x1234 + 10, 0x1234, 0, 0);
   EXPECT_EQ(jpg.extract(0), Join(JpegStart(), data));
 
-  // The picture's own first 16 bytes give way to the FORM start.
+  // The picture's own first 16 bytes give way to the FORM start; only the
+  // bytes behind them are reported, in the copy and in the final total.
   MediaArchive iff(155, data);
-  iff.add("p.iff", 0, 0x1234, 0x1234, 0, 0).add("tiny", 0, 15, 15, 0, 0);
+  std::vector<uint32_t> reports;
+  iff.opened->session.progress = [&](const std::string&, uint32_t n) {
+    reports.push_back(n);
+    return 1;
+  };
+  iff.add("p.iff", 0, 0x1234, 0x1234, 0, 0)
+      .add("tiny", 0, 15, 15, 0, 0)
+      .add("far", 0xFFFFFFF8u, 0x20, 0x20, 0, 0);
   const Bytes ilbm = iff.extract(0);
   EXPECT_EQ(Slice(ilbm, 0, 16),
             (ArchiveBuilder().text("FORM").u8(0).u8(0).u8(0x12).u8(0x2C).text("ILBMBMHD").get()));
   EXPECT_EQ(Slice(ilbm, 16, 0x1234 - 16), Slice(data, 16, 0x1234 - 16));
+  EXPECT_EQ(reports, (std::vector<uint32_t>{0x1224, 0x1224}));
   EXPECT_EQ(iff.extract(0), ilbm);
   Bytes out;
   EXPECT_EQ(iff.extract(1, out), kBadData);
+  // Data past the end of the archive is refused, not read from its start.
+  EXPECT_EQ(iff.extract(2, out), kBadData);
 }
 
 // ---- A real decoder reads what was written --------------------------------

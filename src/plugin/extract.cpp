@@ -202,7 +202,7 @@ int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName) {
     const FormatInfo* info = FindFormat(s.format);
     const MethodFn method = info != nullptr ? info->method : RawCopy;
     method(f);
-    f.Report(entry.PackedSize);
+    f.Report(f.reportedSize);
     os::SetTimes(output.get(), s.times);
   } catch (const Aborted&) {
     result = kAborted;

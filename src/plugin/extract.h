@@ -19,6 +19,9 @@ struct ExtractionFrame {
   os::Handle archive;
   os::Handle output;  // created empty, positioned at 0
   const std::string& destName;
+  // The figure of the final progress report: the entry's PackedSize, unless
+  // the method copies only part of the stored bytes.
+  uint32_t reportedSize = entry.PackedSize;
 
   // Tells the host that `bytes` more are done; throws Aborted on a 0 answer.
   void Report(uint32_t bytes) const;

@@ -166,7 +166,7 @@ std::vector<DetectCase> DetectCases() {
   // 40-byte-name directories: count at 0, the first data offset at 44.
   v.push_back(Case(85, "sample.res", ArchiveBuilder().u32(2).padTo(44).u32(2 * 48 + 4)));
   v.push_back(Case(86, "sample.res", ArchiveBuilder().u32(2).padTo(44).u32(2 * 44 + 4)));
-  // 27-byte records with a 16-bit count of 5.
+  // 27-byte records after a 16-bit count of 1: 5 at 2, the same word at 4 and 8.
   v.push_back(Case(87, "sample.res", ArchiveBuilder().u16(1).u16(5).u32(7).u32(7)));
   // 8.3 names: 3, a count of 2 and the first data offset behind two records.
   v.push_back(Case(88, "sample.res", ArchiveBuilder().u16(3).u16(2).u32(0).padTo(22).u32(52)));
@@ -181,7 +181,7 @@ std::vector<DetectCase> DetectCases() {
   // Numbered offset tables: 3 slots and a multiple of 1000.
   v.push_back(Case(94, "sample.res", ArchiveBuilder().u32(24).u16(3).u16(1000).u32(20)));
   v.push_back(Case(95, "sample.res", ArchiveBuilder().u32(25).u16(3).u16(6000).u32(20)));
-  // Chained names: "A" at 100 for 10 bytes, then "B" at 110.
+  // Chained names in a 100-byte directory: "A" at 104 for 10 bytes, then "B" at 114.
   v.push_back(Case(
       96, "sample.res",
       ArchiveBuilder().u32(100).text("A").u8(0).u32(104).u32(10).text("B").u8(0).u32(114), 124));

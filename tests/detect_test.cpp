@@ -242,6 +242,57 @@ TEST(DetectRules, ArithmeticWraps) {
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(3).padTo(44).u32(3 * 44 + 4))), 86u);
 }
 
+// Near misses: each header meets every condition of its rule but one, so a
+// rule that forgets a condition takes it.
+TEST(DetectRules, EveryConditionCounts) {
+  // The second word of the two-word magics.
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(0xDD72DD12).u32(4))), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(0x7B2B0A68).u32(0x7CE2FF0B))), 0u);
+  // "TEX" 00 01 00 needs its sixth byte.
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().text("TEX").u8(0).u16(0x0101).u32(10).u32(5), 122)), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().text("XXXX").u32(0).text("XXXXXXXY"))), 0u);
+  // The headerless pictures need width x height (x 3) to be d0.
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(100).u32(10).u32(11), 880)), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(108).u32(6).u32(7), 120)), 0u);
+  // 27-byte records: d4 must not be 0; 8.3 names: d4 must be 0.
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u16(1).u16(5).u32(0).u32(0))), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u16(3).u16(2).u32(1).padTo(22).u32(52))), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(16).u32(16 + 8192).u32(3).u32(5))), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(0x2DA2DF95).u32(1).u32(2).u32(0).u32(4))), 0u);
+  // 14-byte names: a zero count at 0, then a broken third sum.
+  auto sums = [](uint16_t w0, uint32_t d86) {
+    return Header(ArchiveBuilder()
+                      .u16(w0)
+                      .text("AA")
+                      .padTo(16)
+                      .u32(1)
+                      .u32(2)
+                      .padTo(38)
+                      .u32(4)
+                      .u32(3)
+                      .padTo(60)
+                      .u32(8)
+                      .u32(7)
+                      .padTo(86)
+                      .u32(d86));
+  };
+  EXPECT_EQ(Detect(sums(1, 15)), 105u);
+  EXPECT_EQ(Detect(sums(0, 15)), 0u);
+  EXPECT_EQ(Detect(sums(1, 16)), 0u);
+  // Image lists: each of the fixed words.
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(0xFFFFFFFF).u32(1).u32(0).u32(80))), 0u);
+  auto list96 = [](uint32_t d64, uint32_t d68, uint32_t d72, uint32_t d96, uint32_t d100) {
+    return Header(
+        ArchiveBuilder().u32(1).padTo(64).u32(d64).u32(d68).u32(d72).padTo(96).u32(d96).u32(d100));
+  };
+  EXPECT_EQ(Detect(list96(0xFFFFFFFF, 0, 32, 0xFFFFFFFF, 0)), 83u);
+  EXPECT_EQ(Detect(list96(0xFFFFFFFE, 0, 32, 0xFFFFFFFF, 0)), 0u);
+  EXPECT_EQ(Detect(list96(0xFFFFFFFF, 1, 32, 0xFFFFFFFF, 0)), 0u);
+  EXPECT_EQ(Detect(list96(0xFFFFFFFF, 0, 33, 0xFFFFFFFF, 0)), 0u);
+  EXPECT_EQ(Detect(list96(0xFFFFFFFF, 0, 32, 0xFFFFFFFE, 0)), 0u);
+  EXPECT_EQ(Detect(list96(0xFFFFFFFF, 0, 32, 0xFFFFFFFF, 1)), 0u);
+}
+
 // A count at 0 whose offset table would end beyond any 32-bit file is not an
 // offset table: 0xFFFFFFFF 0 is the image lists' start, and 4 x 0xFFFFFFFF + 4
 // only wraps to 0.
@@ -293,11 +344,15 @@ TEST(DetectRules, ReadsFromTheFile) {
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(13).u32(110), 110)), 153u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(13).u32(111), 110)), 0u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(8).u32(0), 110)), 0u);  // d0 - 9 before the start
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(13).u32(110).u8(0).u8(1), 110)), 0u);  // not zero
   // The description block at 256, which a shorter file cannot hold.
   const Bytes described =
       Header(ArchiveBuilder().text("AAAA").padTo(256).text("PSVDSC_V2.00\r\n\r\n"));
   EXPECT_EQ(Detect(described), 119u);
   EXPECT_EQ(Detect(Slice(described, 0, 271)), 0u);
+  Bytes lastByte = described;
+  lastByte[271] = ' ';
+  EXPECT_EQ(Detect(lastByte), 0u);
   // A printable byte and five zeros just before d0.
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(106).padTo(100).u8(' '), 107)), 90u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(106).padTo(100).u8(0x1F), 107)), 0u);
@@ -345,6 +400,7 @@ TEST(DetectRules, ExtensionOrder) {
   // Sequences: the 12-byte header needs three small words.
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(1).u32(255).u32(2)), "a.sequence"), 128u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(1).u32(256).u32(2)), "a.sequence"), 129u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(1).u32(255).u32(2).u8(2)), "a.sequence"), 129u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(2).u32(256)), "a.sequence"), 0u);
 }
 
@@ -352,11 +408,16 @@ TEST(DetectRules, ExtensionWithHeaderTests) {
   // The 32-bit value at offset 1, unaligned.
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(1).u32(110 - 9), 110), "a.jaz"), 109u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(1).u32(110 - 8), 110), "a.jaz"), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0).u32(110 - 9), 110), "a.jaz"), 0u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(1).u32(109), 110), "a.pak"), 106u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0).u32(110), 110), "a.dat"), 0u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(2).u32(5)), "a.dat"), 0u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0x11).u8(0xFB).text("AA")), "a.qfs"), 125u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0x12).u8(0xFB).text("AA")), "a.qfs"), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0x10).u8(0xFA).text("AA")), "a.qfs"), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0).u8(2).text("AA")), "a.syj"), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0x78).u8(0x9D).text("AA")), "a.wd"), 148u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().text("AAAA").padTo(8).u8(2)), "a.frame"), 0u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0x1F).text("AAA")), "a.pbo"), 0u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u8(0xDC).text("AAA")), "a.adf"), 0u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(7).u32(8)), "a.meg"), 0u);
@@ -365,6 +426,7 @@ TEST(DetectRules, ExtensionWithHeaderTests) {
   // A 16-bit picture whose pixels do not fit the file.
   EXPECT_EQ(Detect(Header(ArchiveBuilder().text("AAAA").u32(11).u32(6)), "a.rsb"), 149u);
   EXPECT_EQ(Detect(Header(ArchiveBuilder().text("AAAA").u32(12).u32(6)), "a.rsb"), 0u);
+  EXPECT_EQ(Detect(Header(ArchiveBuilder().text("AAAA").u32(67).u32(1), 105), "a.rsb"), 0u);
   for (const char* name : {"a.anm", "a.BIN", "a.img", "a.msk"})
     EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(100).u32(3).u32(4)), name), 141u) << name;
   EXPECT_EQ(Detect(Header(ArchiveBuilder().u32(100).u32(3).u32(0)), "a.anm"), 0u);
@@ -402,6 +464,15 @@ TEST(DetectRules, CompanionFiles) {
   EXPECT_EQ(Detect(Plain(), "data.rfd", {{"data.rfh", Pattern(4)}}), 108u);
   EXPECT_EQ(Detect(Plain(), "data.rfh", {{"data.rfd", Pattern(4)}}), 0u);
   EXPECT_EQ(Detect(Plain(), "data.big", {{"data.fat", Pattern(4)}}), 143u);
+  // An archive of no bytes has no companion.
+  {
+    const TempDir dir;
+    const Bytes h = Header(ArchiveBuilder().text("AAAA").padTo(12).u32(1));
+    const std::string img = dir.write("data.img", h);
+    dir.write("data.dir", Pattern(4));
+    EXPECT_EQ(DetectByRules(h, img, os::kNoFile, 1), 98u);
+    EXPECT_EQ(DetectByRules(h, img, os::kNoFile, 0), 0u);
+  }
   // A folder is not a companion.
   EXPECT_EQ(Detect(Plain(), "data.big", {{"data.fat/x", Pattern(4)}}), 0u);
 }

@@ -34,7 +34,9 @@ Bytes ReadFile(const std::string& path) {
   return Bytes(std::istreambuf_iterator<char>(f), std::istreambuf_iterator<char>());
 }
 
-bool Exists(const std::string& path) { return std::filesystem::exists(path); }
+bool Exists(const std::string& path) {
+  return std::filesystem::exists(path);
+}
 
 std::ostream& operator<<(std::ostream& o, const Listed& l) {
   return o << "{\"" << l.name << "\", " << l.offset << ", " << l.unpacked << ", " << l.packed

@@ -51,10 +51,12 @@ TEST(Fixtures, DumpWhenAsked) {
     std::filesystem::create_directories(dir);
     for (const auto& [name, bytes] : f.companions) {
       std::ofstream(dir / name, std::ios::binary)
-          .write(reinterpret_cast<const char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
+          .write(reinterpret_cast<const char*>(bytes.data()),
+                 static_cast<std::streamsize>(bytes.size()));
     }
     std::ofstream(dir / f.fileName, std::ios::binary)
-        .write(reinterpret_cast<const char*>(f.bytes.data()), static_cast<std::streamsize>(f.bytes.size()));
+        .write(reinterpret_cast<const char*>(f.bytes.data()),
+               static_cast<std::streamsize>(f.bytes.size()));
     list << n << ' ' << f.fileName << '\n';
     ++n;
   }

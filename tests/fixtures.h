@@ -37,7 +37,7 @@ struct FixtureRegistrar {
 
 // Defines a function that builds a fixture and registers it:
 //   CAIRN_FIXTURE(Pwad) { Fixture f; ...; return f; }
-#define CAIRN_FIXTURE(name)                                                         \
-  static ::cairn::test::Fixture name();                                             \
-  static const ::cairn::test::FixtureRegistrar name##Registrar(&name);              \
+#define CAIRN_FIXTURE(name)                                            \
+  static ::cairn::test::Fixture name();                                \
+  static const ::cairn::test::FixtureRegistrar name##Registrar(&name); \
   static ::cairn::test::Fixture name()

@@ -1,8 +1,7 @@
 // The extraction frame and the raw copy: chunking, progress reports, the
 // three endings, file times, and the per-format transforms of the copy.
-#include <sys/stat.h>
-
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
 #include "builder.h"
 #include "plugin/extract.h"
@@ -160,11 +159,11 @@ std::unique_ptr<test::Opened> Catalogue(std::vector<ArchiveEntry> extra) {
 }
 
 TEST(CompositeTrack, JoinsThreeEntriesChosenByTheFlag) {
-  auto o = Catalogue({Entry(0, 0, 2), Entry(0, 0, 62), Entry(0, 0, 39), Entry(0, 0, 92),
-                      Entry(0, 0, 161)});
-  EXPECT_EQ(o->extract(180), (Bytes{61, 0, 0, 0, 60, 0, 0, 0, 64, 0, 0, 0}));   // T, T-1, T+3
+  auto o = Catalogue(
+      {Entry(0, 0, 2), Entry(0, 0, 62), Entry(0, 0, 39), Entry(0, 0, 92), Entry(0, 0, 161)});
+  EXPECT_EQ(o->extract(180), (Bytes{61, 0, 0, 0, 60, 0, 0, 0, 64, 0, 0, 0}));     // T, T-1, T+3
   EXPECT_EQ(o->extract(181), (Bytes{141, 0, 0, 0, 142, 0, 0, 0, 146, 0, 0, 0}));  // T, T+1, T+5
-  EXPECT_EQ(o->extract(182), (Bytes{92, 0, 0, 0, 91, 0, 0, 0, 93, 0, 0, 0}));  // T, T-1, T+1
+  EXPECT_EQ(o->extract(182), (Bytes{92, 0, 0, 0, 91, 0, 0, 0, 93, 0, 0, 0}));     // T, T-1, T+1
   EXPECT_EQ(o->extract(183), (Bytes{137, 0, 0, 0, 136, 0, 0, 0, 138, 0, 0, 0}));
   Bytes out;
   EXPECT_EQ(o->extract(184, out), kBadData);  // table value 0: part -1 is outside

@@ -3,9 +3,8 @@
 // OpenArchive, SetProcessDataProc, ReadHeader and ProcessFile alternately
 // until the end, CloseArchive.
 #include <dlfcn.h>
-#include <sys/stat.h>
-
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
 #include <cstring>
 #include <string>
@@ -66,7 +65,9 @@ int Progress(char* name, int size) {
   return static_cast<int>(g_reports.size()) == g_stopAtReport ? 0 : 1;
 }
 
-int ChangeVolume(char*, int) { return 1; }
+int ChangeVolume(char*, int) {
+  return 1;
+}
 
 struct Listed {
   std::string name;
@@ -82,8 +83,9 @@ struct Walk {
   int endCode = 0;
 };
 
-Walk HostWalk(const std::string& archive, const test::TempDir& out,
-              const std::function<bool(size_t)>& extract = [](size_t) { return true; }) {
+Walk HostWalk(
+    const std::string& archive, const test::TempDir& out,
+    const std::function<bool(size_t)>& extract = [](size_t) { return true; }) {
   const Plugin& p = Loaded();
   Walk w;
   std::string arc = archive;

@@ -95,15 +95,27 @@ std::string Ansi(const std::wstring& w) {
   WideCharToMultiByte(CP_ACP, 0, w.c_str(), -1, s.data(), n, nullptr, nullptr);
   return s;
 }
-void MakeDir(const Text& p) { CreateDirectoryW(p.c_str(), nullptr); }
-uint32_t DosTime(int fileTime) { return static_cast<uint32_t>(fileTime); }
+void MakeDir(const Text& p) {
+  CreateDirectoryW(p.c_str(), nullptr);
+}
+uint32_t DosTime(int fileTime) {
+  return static_cast<uint32_t>(fileTime);
+}
 #else
 using Text = std::string;
 #define T(s) s
-void* Symbol(void* lib, const char* name) { return dlsym(lib, name); }
-std::string Utf8(const std::string& s) { return s; }
-std::string Ansi(const std::string& s) { return s; }
-void MakeDir(const Text& p) { std::system(("mkdir -p '" + p + "'").c_str()); }
+void* Symbol(void* lib, const char* name) {
+  return dlsym(lib, name);
+}
+std::string Utf8(const std::string& s) {
+  return s;
+}
+std::string Ansi(const std::string& s) {
+  return s;
+}
+void MakeDir(const Text& p) {
+  std::system(("mkdir -p '" + p + "'").c_str());
+}
 // The Linux plug-in reports Unix seconds; show them as the DOS time a
 // Windows host would get.
 uint32_t DosTime(int fileTime) {
@@ -248,7 +260,11 @@ int Run(const std::vector<Text>& args) {
 }  // namespace
 
 #ifdef _WIN32
-int wmain(int argc, wchar_t** argv) { return Run(std::vector<Text>(argv, argv + argc)); }
+int wmain(int argc, wchar_t** argv) {
+  return Run(std::vector<Text>(argv, argv + argc));
+}
 #else
-int main(int argc, char** argv) { return Run(std::vector<Text>(argv, argv + argc)); }
+int main(int argc, char** argv) {
+  return Run(std::vector<Text>(argv, argv + argc));
+}
 #endif

@@ -35,7 +35,7 @@ int InflateMember(ExtractionFrame& f, uint32_t offset, uint32_t packedSize, uint
   if (inflateInit(&s.z) != Z_OK) return Z_MEM_ERROR;
   s.open = true;
 
-  uint64_t produced = 0;   // inflated bytes so far
+  uint64_t produced = 0;  // inflated bytes so far
   uint32_t remaining = packedSize;
   uint8_t prefix[4];
   uint64_t wanted = UINT64_MAX;  // bytes still to write after the prefix
@@ -80,7 +80,9 @@ void InflateOrFail(ExtractionFrame& f, uint32_t capacity, bool lengthPrefixed) {
 
 }  // namespace
 
-void Inflate(ExtractionFrame& f) { InflateOrFail(f, f.entry.UnpackedSize, false); }
+void Inflate(ExtractionFrame& f) {
+  InflateOrFail(f, f.entry.UnpackedSize, false);
+}
 
 void RawOrInflate(ExtractionFrame& f) {
   if (f.entry.Flag == 0)

@@ -34,12 +34,16 @@ enum class Transform { None, Xor, PositionKey };
 
 Transform TransformOf(FormatId format, uint8_t flag) {
   switch (format) {
-    case 26: return flag != 0 ? Transform::Xor : Transform::None;
+    case 26:
+      return flag != 0 ? Transform::Xor : Transform::None;
     case 58:
-    case 101: return Transform::Xor;
+    case 101:
+      return Transform::Xor;
     case 65:
-    case 66: return flag == 1 ? Transform::PositionKey : Transform::None;
-    default: return Transform::None;
+    case 66:
+      return flag == 1 ? Transform::PositionKey : Transform::None;
+    default:
+      return Transform::None;
   }
 }
 
@@ -151,8 +155,8 @@ void RestoreStrippedZip(ExtractionFrame& f) {
 }  // namespace
 
 const uint32_t kPositionKeyTable[16] = {
-#define CAIRN_KEY_WORD(k)                                                         \
-  (kPositionKey[(k) % 16] | kPositionKey[((k) + 1) % 16] << 8 |                  \
+#define CAIRN_KEY_WORD(k)                                       \
+  (kPositionKey[(k) % 16] | kPositionKey[((k) + 1) % 16] << 8 | \
    kPositionKey[((k) + 2) % 16] << 16 | static_cast<uint32_t>(kPositionKey[((k) + 3) % 16]) << 24)
     CAIRN_KEY_WORD(0),  CAIRN_KEY_WORD(1),  CAIRN_KEY_WORD(2),  CAIRN_KEY_WORD(3),
     CAIRN_KEY_WORD(4),  CAIRN_KEY_WORD(5),  CAIRN_KEY_WORD(6),  CAIRN_KEY_WORD(7),

@@ -11,6 +11,8 @@ namespace {
 
 // Row n describes FormatId n. A format whose reader is null is answered as
 // not recognised, so that the host can offer the file to someone else.
+// One line a format, however long.
+// clang-format off
 constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {1, "mhx", "\"MHX XS V1.0\" archive", NamedRecordReader, 0, RawCopy},
     {2, "dir", "\"DIR\" archive", DirReader, 0, RawCopy},
@@ -170,6 +172,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {156, "meg", "name list with indexed records", nullptr, 0, RawCopy},
     {157, "bundlelead", "texture bundle with leading block", nullptr, 0, DdsStored},
 }};
+// clang-format on
 
 }  // namespace
 
@@ -178,6 +181,8 @@ const FormatInfo* FindFormat(FormatId id) {
   return &kFormats[id - 1];
 }
 
-std::span<const FormatInfo> AllFormats() { return kFormats; }
+std::span<const FormatInfo> AllFormats() {
+  return kFormats;
+}
 
 }  // namespace cairn

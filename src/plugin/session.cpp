@@ -9,8 +9,8 @@
 
 namespace cairn {
 
-ArchiveEntry& AddEntry(ReaderContext& c, std::string_view name, uint32_t offset,
-                       uint32_t unpacked, uint32_t packed, uint8_t flag, uint32_t extra) {
+ArchiveEntry& AddEntry(ReaderContext& c, std::string_view name, uint32_t offset, uint32_t unpacked,
+                       uint32_t packed, uint8_t flag, uint32_t extra) {
   if (name.size() > kMaxNameLength) throw BadData("name too long");
   ArchiveEntry& e = c.entries.emplace_back();
   e.Name.assign(name);
@@ -71,8 +71,7 @@ Opened OpenAndRecognise(const std::string& path, FormatId forced = 0) {
     o.result = kReadFailed;
     return o;
   }
-  const FormatId id =
-      forced != 0 ? forced : DetectFormat(ByteView(o.header), path, o.file.get());
+  const FormatId id = forced != 0 ? forced : DetectFormat(ByteView(o.header), path, o.file.get());
   const FormatInfo* info = FindFormat(id);
   if (info == nullptr || info->reader == nullptr) {
     o.result = kUnknownFormat;
@@ -112,9 +111,8 @@ int OpenArchiveAs(ArchiveSession& s, const std::string& path, FormatId format) {
     const FormatInfo& info = *FindFormat(o.format);
     const uint32_t size = os::SizeLow(o.file.get());
     s.path = path;
-    ReaderContext c{s,    o.file.get(),       ByteView(o.header),
-                    size, s.path,             FileNamePart(s.path),
-                    s.entries};
+    ReaderContext c{s,      o.file.get(),         ByteView(o.header), size,
+                    s.path, FileNamePart(s.path), s.entries};
     info.reader(c, info.row);
     for (ArchiveEntry& e : s.entries) ToBackslashes(e.Name);
     if (!os::GetTimes(o.file.get(), s.times)) throw BadData("no file times");

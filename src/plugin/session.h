@@ -70,8 +70,8 @@ struct ReaderContext {
 using ReaderFn = void (*)(ReaderContext&, unsigned row);
 
 // Appends an entry; a name of 260 characters or more is refused with BadData.
-ArchiveEntry& AddEntry(ReaderContext& c, std::string_view name, uint32_t offset,
-                       uint32_t unpacked, uint32_t packed, uint8_t flag = 0, uint32_t extra = 0);
+ArchiveEntry& AddEntry(ReaderContext& c, std::string_view name, uint32_t offset, uint32_t unpacked,
+                       uint32_t packed, uint8_t flag = 0, uint32_t extra = 0);
 
 // Reads `length` bytes at `position`; refuses with BadData a block that does
 // not lie inside the archive, before anything is allocated.

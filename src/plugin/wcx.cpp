@@ -21,8 +21,8 @@ using namespace cairn;
 
 struct Plugin {
   ArchiveSession session;
-  void* handle = nullptr;  // what the host holds for the open session
-  size_t cursor = 0;       // the entry the next ReadHeader returns
+  void* handle = nullptr;         // what the host holds for the open session
+  size_t cursor = 0;              // the entry the next ReadHeader returns
   std::optional<size_t> current;  // the entry the last ReadHeader returned
   tProcessDataProc callback = nullptr;
   // Archives opened again before being closed: their handles stay good for
@@ -187,7 +187,9 @@ WCX_EXPORT int WCX_API CanYouHandleThisFile(char* FileName) {
   }
 }
 
-WCX_EXPORT int WCX_API GetPackerCaps(void) { return PK_CAPS_MULTIPLE | PK_CAPS_BY_CONTENT; }
+WCX_EXPORT int WCX_API GetPackerCaps(void) {
+  return PK_CAPS_MULTIPLE | PK_CAPS_BY_CONTENT;
+}
 
 #ifdef _WIN32
 // The wide and 64-bit-size entry points that today's Windows hosts prefer.

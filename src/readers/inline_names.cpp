@@ -74,8 +74,7 @@ void NamedRecordReader(ReaderContext& c, unsigned row) {
       const uint32_t count = c.header.u32le(8);
       const uint32_t stride = c.header.u32le(12);
       if (stride < 16) throw BadData("record too short for a name");
-      const std::vector<uint8_t> block =
-          ReadBlock(c, c.header.u32le(16), uint64_t{count} * stride);
+      const std::vector<uint8_t> block = ReadBlock(c, c.header.u32le(16), uint64_t{count} * stride);
       const ByteView dir(block);
       c.entries.reserve(count);
       for (uint64_t i = 0; i < count; ++i) {

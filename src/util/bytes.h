@@ -84,7 +84,7 @@ class ByteView {
     need(at, 0);
     const char* p = reinterpret_cast<const char*>(data_ + at);
     const size_t limit = size_ - static_cast<size_t>(at) < max ? size_ - static_cast<size_t>(at)
-                                                                : static_cast<size_t>(max);
+                                                               : static_cast<size_t>(max);
     for (size_t n = 0; n < limit; ++n)
       if (p[n] == 0) return {p, n};
     throw BadData("unterminated string");

@@ -2,7 +2,9 @@
 
 namespace cairn {
 
-bool SeekTo(os::Handle h, uint32_t position) { return os::Seek(h, position); }
+bool SeekTo(os::Handle h, uint32_t position) {
+  return os::Seek(h, position);
+}
 
 bool ReadExact(os::Handle h, void* buffer, uint32_t count) {
   return os::Read(h, buffer, count) == count;

@@ -5,9 +5,13 @@
 namespace cairn {
 namespace {
 
-bool IsSeparator(char c) { return kPathSeparators.find(c) != std::string_view::npos; }
+bool IsSeparator(char c) {
+  return kPathSeparators.find(c) != std::string_view::npos;
+}
 
-char Lower(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; }
+char Lower(char c) {
+  return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
 
 }  // namespace
 
@@ -39,7 +43,9 @@ std::string_view StripExtension(std::string_view name) {
   return {};
 }
 
-void ToBackslashes(std::string& name) { std::replace(name.begin(), name.end(), '/', '\\'); }
+void ToBackslashes(std::string& name) {
+  std::replace(name.begin(), name.end(), '/', '\\');
+}
 
 std::string NumberedName(std::string_view prefix, uint32_t number) {
   std::string digits = std::to_string(number);

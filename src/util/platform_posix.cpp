@@ -12,7 +12,9 @@
 namespace cairn::os {
 namespace {
 
-int Fd(Handle h) { return static_cast<int>(h); }
+int Fd(Handle h) {
+  return static_cast<int>(h);
+}
 
 uint64_t Nanoseconds(const timespec& t) {
   return static_cast<uint64_t>(t.tv_sec) * 1000000000u + static_cast<uint64_t>(t.tv_nsec);
@@ -42,11 +44,19 @@ Handle OpenRegular(const char* path, int flags) {
 
 }  // namespace
 
-PathEncoding SetPathEncoding(PathEncoding e) { return e; }
+PathEncoding SetPathEncoding(PathEncoding e) {
+  return e;
+}
 
-Handle OpenShared(const char* path) { return OpenRegular(path, O_RDONLY); }
-Handle CreateAlways(const char* path) { return OpenRegular(path, O_RDWR | O_CREAT | O_TRUNC); }
-Handle OpenExisting(const char* path) { return OpenRegular(path, O_RDWR); }
+Handle OpenShared(const char* path) {
+  return OpenRegular(path, O_RDONLY);
+}
+Handle CreateAlways(const char* path) {
+  return OpenRegular(path, O_RDWR | O_CREAT | O_TRUNC);
+}
+Handle OpenExisting(const char* path) {
+  return OpenRegular(path, O_RDWR);
+}
 
 void Close(Handle h) {
   if (h != kNoFile) ::close(Fd(h));
@@ -109,8 +119,8 @@ uint32_t DosTime(const FileTimes& times) {
   int year = local.tm_year + 1900;
   if (year < 1980) return (0u << 25) | (1u << 21) | (1u << 16);  // 1980-01-01 00:00:00
   if (year > 2107) year = 2107;
-  const uint32_t date = static_cast<uint32_t>((year - 1980) << 9 | (local.tm_mon + 1) << 5 |
-                                              local.tm_mday);
+  const uint32_t date =
+      static_cast<uint32_t>((year - 1980) << 9 | (local.tm_mon + 1) << 5 | local.tm_mday);
   const uint32_t clock =
       static_cast<uint32_t>(local.tm_hour << 11 | local.tm_min << 5 | local.tm_sec / 2);
   return date << 16 | clock;
@@ -120,6 +130,8 @@ int64_t UnixTime(const FileTimes& times) {
   return static_cast<int64_t>(times.write / 1000000000u);
 }
 
-bool Delete(const char* path) { return path != nullptr && ::unlink(path) == 0; }
+bool Delete(const char* path) {
+  return path != nullptr && ::unlink(path) == 0;
+}
 
 }  // namespace cairn::os

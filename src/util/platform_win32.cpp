@@ -10,7 +10,9 @@ namespace {
 
 PathEncoding g_encoding = PathEncoding::Ansi;
 
-HANDLE H(Handle h) { return reinterpret_cast<HANDLE>(h); }
+HANDLE H(Handle h) {
+  return reinterpret_cast<HANDLE>(h);
+}
 
 Handle FromHandle(HANDLE h) {
   return h == INVALID_HANDLE_VALUE ? kNoFile : reinterpret_cast<Handle>(h);
@@ -65,13 +67,13 @@ Handle OpenShared(const char* path) {
 }
 
 Handle CreateAlways(const char* path) {
-  return Open(path, GENERIC_READ | GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE,
-              CREATE_ALWAYS, FILE_FLAG_RANDOM_ACCESS);
+  return Open(path, GENERIC_READ | GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE, CREATE_ALWAYS,
+              FILE_FLAG_RANDOM_ACCESS);
 }
 
 Handle OpenExisting(const char* path) {
-  return Open(path, GENERIC_READ | GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE,
-              OPEN_EXISTING, FILE_FLAG_RANDOM_ACCESS);
+  return Open(path, GENERIC_READ | GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE, OPEN_EXISTING,
+              FILE_FLAG_RANDOM_ACCESS);
 }
 
 void Close(Handle h) {
@@ -96,7 +98,9 @@ uint32_t Write(Handle h, const void* buffer, uint32_t count) {
   return put;
 }
 
-uint32_t SizeLow(Handle h) { return GetFileSize(H(h), nullptr); }
+uint32_t SizeLow(Handle h) {
+  return GetFileSize(H(h), nullptr);
+}
 
 namespace {
 

@@ -1,6 +1,7 @@
 #include "builder.h"
 
 #include <gtest/gtest.h>
+#include <zlib.h>
 
 #include <atomic>
 #include <ostream>
@@ -27,6 +28,15 @@ std::string TempDir::write(std::string_view name, const Bytes& b) const {
   std::ofstream f(p, std::ios::binary | std::ios::trunc);
   f.write(reinterpret_cast<const char*>(b.data()), static_cast<std::streamsize>(b.size()));
   return p;
+}
+
+Bytes Compress(const Bytes& data, int level) {
+  uLongf size = compressBound(static_cast<uLong>(data.size()));
+  Bytes out(size);
+  EXPECT_EQ(compress2(out.data(), &size, data.data(), static_cast<uLong>(data.size()), level),
+            Z_OK);
+  out.resize(size);
+  return out;
 }
 
 Bytes ReadFile(const std::string& path) {

@@ -70,6 +70,14 @@ inline Bytes Pattern(size_t n, uint8_t seed = 1) {
   return b;
 }
 
+inline Bytes Join(Bytes a, const Bytes& b) {
+  a.insert(a.end(), b.begin(), b.end());
+  return a;
+}
+
+// A complete zlib stream of `data`.
+Bytes Compress(const Bytes& data, int level = -1);
+
 inline Bytes Slice(const Bytes& b, size_t at, size_t n) {
   return Bytes(b.begin() + static_cast<std::ptrdiff_t>(at),
                b.begin() + static_cast<std::ptrdiff_t>(at + n));

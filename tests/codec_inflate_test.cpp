@@ -8,11 +8,6 @@
 namespace cairn::test {
 namespace {
 
-Bytes Join(Bytes a, const Bytes& b) {
-  a.insert(a.end(), b.begin(), b.end());
-  return a;
-}
-
 TEST(InflateMethod, AStreamShorterThanItsCapacityGivesItsOwnLength) {
   const Bytes data = Pattern(300);
   const Bytes z = Compress(data);

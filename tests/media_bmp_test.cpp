@@ -12,11 +12,6 @@
 namespace cairn::test {
 namespace {
 
-Bytes Join(Bytes a, const Bytes& b) {
-  a.insert(a.end(), b.begin(), b.end());
-  return a;
-}
-
 Bytes Palette4() {
   return Bytes(kBuiltInPalette4.begin(), kBuiltInPalette4.end());
 }

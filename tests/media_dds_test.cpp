@@ -10,11 +10,6 @@
 namespace cairn::test {
 namespace {
 
-Bytes Join(Bytes a, const Bytes& b) {
-  a.insert(a.end(), b.begin(), b.end());
-  return a;
-}
-
 // Everything up to the pixel format, then the pixel format and the caps.
 ArchiveBuilder DdsStart(uint32_t height, uint32_t width, uint32_t mipmaps) {
   ArchiveBuilder b;

@@ -13,19 +13,6 @@ Bytes Header(uint16_t w, uint16_t h, uint8_t type, uint8_t bits, uint8_t descrip
   return ArchiveBuilder().u8(0).u8(0).u8(type).fill(9).u16(w).u16(h).u8(bits).u8(descriptor).get();
 }
 
-Bytes Join(Bytes a, const Bytes& b) {
-  a.insert(a.end(), b.begin(), b.end());
-  return a;
-}
-
-Bytes Compress(const Bytes& raw) {
-  uLongf n = compressBound(raw.size());
-  Bytes out(n);
-  EXPECT_EQ(compress(out.data(), &n, raw.data(), raw.size()), Z_OK);
-  out.resize(n);
-  return out;
-}
-
 // 256 red-green-blue colours: colour i is (i, 255 - i, i ^ 0x5A).
 Bytes RgbPalette() {
   Bytes p;

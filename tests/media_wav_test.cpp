@@ -8,11 +8,6 @@
 namespace cairn::test {
 namespace {
 
-Bytes Join(Bytes a, const Bytes& b) {
-  a.insert(a.end(), b.begin(), b.end());
-  return a;
-}
-
 Bytes Fmt(uint32_t riff, uint32_t rate, uint32_t perSecond, uint16_t align, uint16_t bits) {
   return ArchiveBuilder()
       .text("RIFF")

@@ -33,16 +33,6 @@ inline void ExpectRefused(FormatId id, const Bytes& bytes, std::string_view file
   EXPECT_TRUE(o->session.entries.empty());
 }
 
-// A complete zlib stream of `data`.
-inline Bytes Compress(const Bytes& data, int level = Z_DEFAULT_COMPRESSION) {
-  uLongf size = compressBound(static_cast<uLong>(data.size()));
-  Bytes out(size);
-  EXPECT_EQ(compress2(out.data(), &size, data.data(), static_cast<uLong>(data.size()), level),
-            Z_OK);
-  out.resize(size);
-  return out;
-}
-
 inline Bytes Text(std::string_view s) {
   return Bytes(s.begin(), s.end());
 }

@@ -6,7 +6,7 @@ set -euo pipefail
 cd "$(dirname "${BASH_SOURCE[0]}")/.."
 
 bash tools/install-packages.sh
-cmake -S . -B build && cmake --build build -j2
+cmake -S . -B build && cmake --build build -j2 --target cairn_cli cairn_wcx
 
 run() {
   echo

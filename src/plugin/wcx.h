@@ -14,15 +14,19 @@
 #define WCX_EXPORT extern "C" __attribute__((visibility("default")))
 #endif
 
-struct tOpenArchiveData {
-  char* ArcName;
+// The open record, with the archive's path in 8-bit or (Windows' wide entry
+// points) 16-bit characters.
+template <typename Char>
+struct tOpenArchiveDataOf {
+  Char* ArcName;
   int OpenMode;
   int OpenResult;
-  char* CmtBuf;
+  Char* CmtBuf;
   int CmtBufSize;
   int CmtSize;
   int CmtState;
 };
+using tOpenArchiveData = tOpenArchiveDataOf<char>;
 
 struct tHeaderData {
   char ArcName[260];
@@ -43,15 +47,7 @@ struct tHeaderData {
 };
 
 #ifdef _WIN32
-struct tOpenArchiveDataW {
-  wchar_t* ArcName;
-  int OpenMode;
-  int OpenResult;
-  wchar_t* CmtBuf;
-  int CmtBufSize;
-  int CmtSize;
-  int CmtState;
-};
+using tOpenArchiveDataW = tOpenArchiveDataOf<wchar_t>;
 
 // The extended header records: 1024-character names and 64-bit sizes.
 template <typename Char>

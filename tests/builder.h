@@ -70,6 +70,10 @@ inline Bytes Pattern(size_t n, uint8_t seed = 1) {
   return b;
 }
 
+inline Bytes Text(std::string_view s) {
+  return Bytes(s.begin(), s.end());
+}
+
 inline Bytes Join(Bytes a, const Bytes& b) {
   a.insert(a.end(), b.begin(), b.end());
   return a;

@@ -72,10 +72,6 @@ ToolRun Cairn(const std::vector<std::string>& args, const std::string& cwd = "")
   return r;
 }
 
-Bytes Text(std::string_view s) {
-  return Bytes(s.begin(), s.end());
-}
-
 using Lumps = std::vector<std::pair<std::string, Bytes>>;
 
 // A "PWAD" lump archive: the 12-byte header (magic, count, directory

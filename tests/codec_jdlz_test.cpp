@@ -19,7 +19,7 @@ TEST(Jdlz, LiteralsAndBothMatchForms) {
   // F1 0x30: four literals and two matches; F2 0x01: the first match is
   // short (distance 1, length 0x809 + 3), the second long: 0xE0 0xFF is
   // distance 2064, length 3, which reaches back to "ABC".
-  Bytes want = Str("ABCz");
+  Bytes want = Text("ABCz");
   CopyBack(want, 1, 2060);
   CopyBack(want, 2064, 3);
   EXPECT_EQ(Decode({0x30, 0x01, 'A', 'B', 'C', 'z', 0x80, 0x09, 0xE0, 0xFF}, 2067), want);
@@ -27,7 +27,7 @@ TEST(Jdlz, LiteralsAndBothMatchForms) {
   // The longest forms: 0xFF 0xFF short is distance 16, length 4098; 0x1F
   // 0x00 long is distance 17, length 34.
   JdlzWriter w;
-  want = Str("0123456789abcdefg");
+  want = Text("0123456789abcdefg");
   for (uint8_t b : want) w.literal(b);
   w.match(16, 4098);
   w.match(17, 34);
@@ -41,7 +41,7 @@ TEST(Jdlz, OverlappingCopiesRepeatRecentBytes) {
   for (size_t distance = 1; distance <= 16; ++distance) {
     for (size_t length = 3; length <= 70; ++length) {
       JdlzWriter w;
-      Bytes want = Str("ponmlkjihgfedcba");
+      Bytes want = Text("ponmlkjihgfedcba");
       for (uint8_t b : want) w.literal(b);
       w.match(distance, length);
       CopyBack(want, distance, length);
@@ -59,7 +59,7 @@ TEST(Jdlz, FlagBytesFallingDueTogetherRefillF1First) {
   Bytes coded = {0x00, 0xFF, 'a', 'b', 'c', 'd', 'e', 'f', 'g', 'h', 0xFF};
   for (int k = 0; k < 8; ++k) coded.insert(coded.end(), {0x07, 0x00});
   coded.insert(coded.end(), {0x01, 0x00, 0x05, 0x03});
-  Bytes want = Str("abcdefgh");
+  Bytes want = Text("abcdefgh");
   for (int k = 0; k < 8; ++k) CopyBack(want, 8, 3);
   CopyBack(want, 20, 8);
   EXPECT_EQ(Decode(coded, 40), want);
@@ -70,9 +70,9 @@ TEST(Jdlz, LiteralsOnAFullOutputTakeNoByteButCountAgainstTheRest) {
   // they take no coded byte, so the F1 refill reads the byte right after
   // 'a' (0x00, eight more literals), and the two that follow use up the
   // rest. Had they taken bytes, F1 would be 0x01 and a match would overflow.
-  EXPECT_EQ(Decode({0x00, 0xFF, 'a', 0x00, 0, 0, 0, 0, 0, 0, 0x01, 0x00, 0x00}, 1), Str("a"));
+  EXPECT_EQ(Decode({0x00, 0xFF, 'a', 0x00, 0, 0, 0, 0, 0, 0, 0x01, 0x00, 0x00}, 1), Text("a"));
   // Plain trailing literals past a full output are dropped.
-  EXPECT_EQ(Decode({0x00, 0x00, 'a', 'b', 'c', 'd'}, 2), Str("ab"));
+  EXPECT_EQ(Decode({0x00, 0x00, 'a', 'b', 'c', 'd'}, 2), Text("ab"));
 }
 
 TEST(Jdlz, EndConditions) {
@@ -83,15 +83,16 @@ TEST(Jdlz, EndConditions) {
   EXPECT_EQ(Decode({0x00}, 0), Bytes());
   // Eight tokens end the stream whether or not the F1 byte due after them
   // is there.
-  EXPECT_EQ(Decode({0x00, 0x00, '1', '2', '3', '4', '5', '6', '7', '8'}, 8), Str("12345678"));
-  EXPECT_EQ(Decode({0x00, 0x00, '1', '2', '3', '4', '5', '6', '7', '8', 0x00}, 8), Str("12345678"));
+  EXPECT_EQ(Decode({0x00, 0x00, '1', '2', '3', '4', '5', '6', '7', '8'}, 8), Text("12345678"));
+  EXPECT_EQ(Decode({0x00, 0x00, '1', '2', '3', '4', '5', '6', '7', '8', 0x00}, 8),
+            Text("12345678"));
   // A stream that ends early leaves zeros, also right after a match that is
   // copied in whole blocks.
   EXPECT_EQ(Decode({0x00, 0x00, 'a', 'b'}, 5), Bytes({'a', 'b', 0, 0, 0}));
   JdlzWriter w;
-  for (uint8_t b : Str("abcdefgh")) w.literal(b);
+  for (uint8_t b : Text("abcdefgh")) w.literal(b);
   w.match(8, 5);
-  Bytes want = Str("abcdefghabcde");
+  Bytes want = Text("abcdefghabcde");
   want.resize(16, 0);
   EXPECT_EQ(Decode(w.bytes(), 16), want);
 }
@@ -124,13 +125,13 @@ TEST(Jdlz, ExtractsEntriesThroughTheFrame) {
   const Bytes good = {0x02, 0x01, 'a', 0x00, 0x07};
   const Bytes bad = {0x01, 0x01, 0x00, 0x00};
   const Bytes archive = ArchiveBuilder().text("JDLZhead").bytes(good).bytes(bad).text("tail").get();
-  auto o = OpenWithEntries(50, archive,
-                           {
-                               {"a.bin", 8, 11, 5},
-                               {"short.bin", 8, 14, 5},  // ends early: zeros follow
-                               {"bad.bin", 13, 3, 4},
-                               {"past.bin", 13, 3, 9},  // stored bytes run past the end
-                           });
+  auto o = SessionOver(50, archive,
+                       {
+                           {"a.bin", 8, 11, 5},
+                           {"short.bin", 8, 14, 5},  // ends early: zeros follow
+                           {"bad.bin", 13, 3, 4},
+                           {"past.bin", 13, 3, 9},  // stored bytes run past the end
+                       });
   ASSERT_EQ(o->result, kOk);
   EXPECT_EQ(o->extract(0), Bytes(11, 'a'));
   Bytes want(11, 'a');

@@ -24,10 +24,10 @@ void Literals(Bytes& coded, const Bytes& data) {
 
 TEST(OpcodeLz, SmallestOfEachClass) {
   EXPECT_EQ(Decode({0xFC}, 0), Bytes());
-  EXPECT_EQ(Decode({0xFD, 'x'}, 1), Str("x"));
-  EXPECT_EQ(Decode({0xE0, 'a', 'b', 'c', 'd', 0xFC}, 4), Str("abcd"));
+  EXPECT_EQ(Decode({0xFD, 'x'}, 1), Text("x"));
+  EXPECT_EQ(Decode({0xE0, 'a', 'b', 'c', 'd', 0xFC}, 4), Text("abcd"));
   // One literal 'a', then distance 1, length 3.
-  EXPECT_EQ(Decode({0x01, 0x00, 'a', 0xFC}, 4), Str("aaaa"));
+  EXPECT_EQ(Decode({0x01, 0x00, 'a', 0xFC}, 4), Text("aaaa"));
   // 0x80: no literals, length 4, distance 1; 0xC0: length 5, distance 1.
   EXPECT_EQ(Decode({0x01, 0x00, 'm', 0x80, 0x00, 0x00, 0xC0, 0x00, 0x00, 0x00, 0xFC}, 13),
             Bytes(13, 'm'));
@@ -86,12 +86,12 @@ TEST(OpcodeLz, CopyFieldsAreReadFromTheirBits) {
 TEST(OpcodeLz, EndConditions) {
   // The last opcode ends at the last coded byte: no end opcode needed once
   // the output is full.
-  EXPECT_EQ(Decode({0x01, 0x00, 'a'}, 4), Str("aaaa"));
+  EXPECT_EQ(Decode({0x01, 0x00, 'a'}, 4), Text("aaaa"));
   // Bytes after the end opcode are not read.
-  EXPECT_EQ(Decode({0xFD, 'x', 0xC0, 0x12}, 1), Str("x"));
+  EXPECT_EQ(Decode({0xFD, 'x', 0xC0, 0x12}, 1), Text("x"));
   // The end opcode's literals are skipped when the output is already full.
-  EXPECT_EQ(Decode({0x01, 0x00, 'a', 0xFF, 'x', 'y', 'z'}, 4), Str("aaaa"));
-  EXPECT_EQ(Decode({0x01, 0x00, 'a', 0xFE}, 4), Str("aaaa"));
+  EXPECT_EQ(Decode({0x01, 0x00, 'a', 0xFF, 'x', 'y', 'z'}, 4), Text("aaaa"));
+  EXPECT_EQ(Decode({0x01, 0x00, 'a', 0xFE}, 4), Text("aaaa"));
   // Nothing coded decodes to nothing.
   EXPECT_EQ(Decode({}, 0), Bytes());
 }
@@ -122,11 +122,11 @@ TEST(OpcodeLz, RefusesInvalidData) {
     b.insert(b.end(), tail);
     return b;
   };
-  EXPECT_EQ(Decode(with({0x00, 0x03}), 7), Str("abcdabc"));
+  EXPECT_EQ(Decode(with({0x00, 0x03}), 7), Text("abcdabc"));
   EXPECT_THROW(Decode(with({0x00, 0x04}), 7), BadData);
-  EXPECT_EQ(Decode(with({0x80, 0x00, 0x03}), 8), Str("abcdabcd"));
+  EXPECT_EQ(Decode(with({0x80, 0x00, 0x03}), 8), Text("abcdabcd"));
   EXPECT_THROW(Decode(with({0x80, 0x00, 0x04}), 8), BadData);
-  EXPECT_EQ(Decode(with({0xC0, 0x00, 0x03, 0x00}), 9), Str("abcdabcda"));
+  EXPECT_EQ(Decode(with({0xC0, 0x00, 0x03, 0x00}), 9), Text("abcdabcda"));
   EXPECT_THROW(Decode(with({0xC0, 0x00, 0x04, 0x00}), 9), BadData);
   EXPECT_THROW(Decode({0x00, 0x00}, 3), BadData);
   // Opcode bytes past the coded bytes, in every class.
@@ -149,14 +149,14 @@ TEST(OpcodeLz, RoundTripsGeneratedData) {
 
 TEST(OpcodeLz, ExtractsEntriesThroughTheFrame) {
   const Bytes archive = ArchiveBuilder().text("QFS\x10\xFB").bytes({0x01, 0x00, 'a', 0xFC}).get();
-  auto o = OpenWithEntries(125, archive,
-                           {
-                               {"a.bin", 5, 4, 4},
-                               {"long.bin", 5, 5, 4},  // one byte short
-                               {"past.bin", 5, 4, 5},  // stored bytes run past the end
-                           });
+  auto o = SessionOver(125, archive,
+                       {
+                           {"a.bin", 5, 4, 4},
+                           {"long.bin", 5, 5, 4},  // one byte short
+                           {"past.bin", 5, 4, 5},  // stored bytes run past the end
+                       });
   ASSERT_EQ(o->result, kOk);
-  EXPECT_EQ(o->extract(0), Str("aaaa"));
+  EXPECT_EQ(o->extract(0), Text("aaaa"));
   Bytes out;
   EXPECT_EQ(o->extract(1, out), kBadData);
   EXPECT_EQ(o->extract(2, out), kBadData);

@@ -12,7 +12,7 @@ Bytes Decode(const Bytes& coded, uint32_t size) {
 }
 
 TEST(Rle, LiteralAndRepeatRuns) {
-  EXPECT_EQ(Decode({0x83, 'a', 'b', 'c', 0x04, 'z'}, 7), Str("abczzzz"));
+  EXPECT_EQ(Decode({0x83, 'a', 'b', 'c', 0x04, 'z'}, 7), Text("abczzzz"));
   // The longest runs of each kind.
   Bytes coded = {0x7F, 'q', 0xFF};
   const Bytes literals = Pattern(127);
@@ -24,12 +24,12 @@ TEST(Rle, LiteralAndRepeatRuns) {
 
 TEST(Rle, RunsOfLengthZero) {
   // 0x00 still takes the byte after it: 'x' is not read as a control byte.
-  EXPECT_EQ(Decode({0x00, 'x', 0x82, 'p', 'q'}, 2), Str("pq"));
+  EXPECT_EQ(Decode({0x00, 'x', 0x82, 'p', 'q'}, 2), Text("pq"));
   // 0x80 takes nothing more: 0x02 is the next control byte.
-  EXPECT_EQ(Decode({0x80, 0x02, 'k'}, 2), Str("kk"));
+  EXPECT_EQ(Decode({0x80, 0x02, 'k'}, 2), Text("kk"));
   // At the very end, 0x00 has no byte to take and needs none.
-  EXPECT_EQ(Decode({0x81, 'a', 0x00}, 1), Str("a"));
-  EXPECT_EQ(Decode({0x81, 'a', 0x80}, 1), Str("a"));
+  EXPECT_EQ(Decode({0x81, 'a', 0x00}, 1), Text("a"));
+  EXPECT_EQ(Decode({0x81, 'a', 0x80}, 1), Text("a"));
 }
 
 TEST(Rle, EndConditions) {
@@ -68,15 +68,15 @@ TEST(Rle, ExtractsEntriesThroughTheFrame) {
                             .bytes({0x83, 'a', 'b', 'c', 0x04, 'z'})
                             .bytes({0x05, 'a'})
                             .get();
-  auto o = OpenWithEntries(7, archive,
-                           {
-                               {"a.bin", 4, 7, 6, 0, 1},  // the Flag does not matter
-                               {"long.bin", 4, 9, 6},     // zeros after the runs
-                               {"over.bin", 10, 4, 2},    // a run past the size
-                               {"past.bin", 10, 5, 3},    // stored bytes run past the end
-                           });
+  auto o = SessionOver(7, archive,
+                       {
+                           {"a.bin", 4, 7, 6, 0, 1},  // the Flag does not matter
+                           {"long.bin", 4, 9, 6},     // zeros after the runs
+                           {"over.bin", 10, 4, 2},    // a run past the size
+                           {"past.bin", 10, 5, 3},    // stored bytes run past the end
+                       });
   ASSERT_EQ(o->result, kOk);
-  EXPECT_EQ(o->extract(0), Str("abczzzz"));
+  EXPECT_EQ(o->extract(0), Text("abczzzz"));
   EXPECT_EQ(o->extract(1), Bytes({'a', 'b', 'c', 'z', 'z', 'z', 'z', 0, 0}));
   Bytes out;
   EXPECT_EQ(o->extract(2, out), kBadData);
@@ -96,20 +96,20 @@ TEST(BlockJoin, JoinsBlocksUntilTheirLengthsReachPackedSize) {
   Block(b, "de");     // 17: L = 3
   Block(b, "fghi");   // 24: L = 5
   Block(b, "never");  // 33: past every entry's PackedSize
-  auto o = OpenWithEntries(75, b.get(),
-                           {
-                               {"one.bin", 4, 0, 1},    // L = 1: nothing written
-                               {"two.bin", 9, 5, 7},    // 4 + 3: "abc" + "de"
-                               {"empty.bin", 9, 0, 0},  // no block read at all
-                               {"over.bin", 9, 5, 5},   // the block that passes 5 is whole
-                               {"chain.bin", 4, 9, 13, 0, 3},
-                           });
+  auto o = SessionOver(75, b.get(),
+                       {
+                           {"one.bin", 4, 0, 1},    // L = 1: nothing written
+                           {"two.bin", 9, 5, 7},    // 4 + 3: "abc" + "de"
+                           {"empty.bin", 9, 0, 0},  // no block read at all
+                           {"over.bin", 9, 5, 5},   // the block that passes 5 is whole
+                           {"chain.bin", 4, 9, 13, 0, 3},
+                       });
   ASSERT_EQ(o->result, kOk);
   EXPECT_EQ(o->extract(0), Bytes());
-  EXPECT_EQ(o->extract(1), Str("abcde"));
+  EXPECT_EQ(o->extract(1), Text("abcde"));
   EXPECT_EQ(o->extract(2), Bytes());
-  EXPECT_EQ(o->extract(3), Str("abcde"));
-  EXPECT_EQ(o->extract(4), Str("abcdefghi"));
+  EXPECT_EQ(o->extract(3), Text("abcde"));
+  EXPECT_EQ(o->extract(4), Text("abcdefghi"));
 }
 
 TEST(BlockJoin, FailsOnBadChains) {
@@ -119,12 +119,12 @@ TEST(BlockJoin, FailsOnBadChains) {
   b.u16(0).u8(0).u8(0).u8(0);              // 12: L = 0
   b.u16(40).u8(0).u8(0).u8(0).text("xy");  // 17: claims 39 data bytes; 9 follow
   Block(b, "ok");                          // 24: ends the archive
-  auto o = OpenWithEntries(75, b.get(),
-                           {
-                               {"zero.bin", 4, 3, 5},
-                               {"short.bin", 17, 39, 40},
-                               {"noheader.bin", 24, 2, 6},  // wants a block after the end
-                           });
+  auto o = SessionOver(75, b.get(),
+                       {
+                           {"zero.bin", 4, 3, 5},
+                           {"short.bin", 17, 39, 40},
+                           {"noheader.bin", 24, 2, 6},  // wants a block after the end
+                       });
   ASSERT_EQ(o->result, kOk);
   Bytes out;
   EXPECT_EQ(o->extract(0, out), kBadData);

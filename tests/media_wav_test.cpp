@@ -115,10 +115,6 @@ std::optional<Bytes> ReadWaves(const std::vector<std::string>& paths) {
   return Capture(command + " 2>/dev/null");
 }
 
-Bytes Text(std::string_view s) {
-  return Bytes(s.begin(), s.end());
-}
-
 TEST(WavDecoded, PythonReadsTheFieldsAndSamples) {
   CAIRN_NEED_TOOL("python3");
   const Bytes samples = Pattern(600);

@@ -3,12 +3,12 @@
 #pragma once
 
 #include <gtest/gtest.h>
-#include <zlib.h>
 
 #include <string_view>
 #include <vector>
 
 #include "builder.h"
+#include "fixture_replay.h"
 #include "fixtures.h"
 
 namespace cairn::test {
@@ -24,17 +24,6 @@ inline void ExpectListsAndExtracts(FormatId id, const Fixture& f,
     EXPECT_EQ(listing[i].name, f.entries[i].name);
     EXPECT_EQ(o->extract(i), f.entries[i].bytes) << f.entries[i].name;
   }
-}
-
-// Opens `bytes` as FormatId `id` and expects the open to be refused.
-inline void ExpectRefused(FormatId id, const Bytes& bytes, std::string_view fileName = "bad.bin") {
-  auto o = OpenBytesAs(id, bytes, fileName);
-  EXPECT_EQ(o->result, kBadData);
-  EXPECT_TRUE(o->session.entries.empty());
-}
-
-inline Bytes Text(std::string_view s) {
-  return Bytes(s.begin(), s.end());
 }
 
 }  // namespace cairn::test

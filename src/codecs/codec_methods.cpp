@@ -5,25 +5,16 @@
 
 #include "codecs/codecs.h"
 #include "codecs/methods.h"
+#include "plugin/stored.h"
 
 namespace cairn {
 namespace {
 
-// The entry's stored bytes; a range that does not lie inside the archive is
-// refused before anything is allocated.
-std::vector<uint8_t> ReadStored(const ExtractionFrame& f) {
-  const ArchiveEntry& e = f.entry;
-  if (uint64_t{e.Offset} + e.PackedSize > os::SizeLow(f.archive))
-    throw BadData("entry runs past the archive");
-  std::vector<uint8_t> stored(e.PackedSize);
-  if (!ReadAt(f.archive, stored.data(), e.Offset, e.PackedSize)) throw BadData("short read");
-  return stored;
-}
-
 using DecodeFn = std::vector<uint8_t> (*)(ByteView coded, uint32_t unpackedSize);
 
 void DecodeEntry(ExtractionFrame& f, DecodeFn decode) {
-  std::vector<uint8_t> out = decode(ReadStored(f), f.entry.UnpackedSize);
+  std::vector<uint8_t> out =
+      decode(ReadStored(f, f.entry.Offset, f.entry.PackedSize), f.entry.UnpackedSize);
   f.Write(out);
 }
 

@@ -10,7 +10,7 @@
 
 #include "media/media.h"
 #include "media/palettes.h"
-#include "media/stored.h"
+#include "plugin/stored.h"
 #include "util/names.h"
 
 namespace cairn {

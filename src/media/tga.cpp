@@ -10,7 +10,7 @@
 #include "codecs/methods.h"
 #include "media/media.h"
 #include "media/palettes.h"
-#include "media/stored.h"
+#include "plugin/stored.h"
 
 namespace cairn {
 namespace {

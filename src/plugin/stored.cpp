@@ -1,4 +1,4 @@
-#include "media/stored.h"
+#include "plugin/stored.h"
 
 #include "util/file.h"
 

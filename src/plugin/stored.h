@@ -1,4 +1,4 @@
-// Reads of stored bytes for the writers that build their file in memory. A
+// Reads of stored bytes for the methods that build their file in memory. A
 // range is checked against the archive's size before anything is allocated
 // for it, so no buffer is ever sized by a field the archive cannot back.
 #pragma once

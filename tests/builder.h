@@ -11,8 +11,9 @@
 #include <string_view>
 #include <vector>
 
-#include "plugin/extract.h"
-#include "plugin/session.h"
+#include "core/extract.h"
+#include "formats/archive.h"
+#include "core/session.h"
 
 namespace cairn::test {
 

@@ -18,7 +18,7 @@
 #include "builder.h"
 #include "detect_fixtures.h"
 #include "fixtures.h"
-#include "plugin/registry.h"
+#include "formats/registry.h"
 
 extern char** environ;
 

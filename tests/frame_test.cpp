@@ -4,7 +4,7 @@
 #include <sys/stat.h>
 
 #include "builder.h"
-#include "plugin/extract.h"
+#include "core/extract.h"
 
 namespace cairn {
 namespace {

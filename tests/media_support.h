@@ -12,8 +12,8 @@
 #include <string>
 
 #include "builder.h"
-#include "plugin/extract.h"
-#include "plugin/session.h"
+#include "core/extract.h"
+#include "core/session.h"
 #include "util/file.h"
 
 namespace cairn::test {

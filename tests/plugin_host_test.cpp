@@ -12,7 +12,7 @@
 
 #include "builder.h"
 #include "fixtures.h"
-#include "plugin/wcx.h"
+#include "hosts/wcx/wcx.h"
 
 namespace cairn {
 namespace {

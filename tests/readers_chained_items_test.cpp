@@ -4,7 +4,7 @@
 #include <gtest/gtest.h>
 
 #include "fixture_replay.h"
-#include "plugin/registry.h"
+#include "formats/registry.h"
 
 namespace cairn::test {
 namespace {

@@ -5,7 +5,7 @@
 
 #include "codecs/codecs.h"
 #include "codecs/methods.h"
-#include "plugin/stored.h"
+#include "core/stored.h"
 
 namespace cairn {
 namespace {

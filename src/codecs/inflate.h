@@ -3,7 +3,7 @@
 
 #include <cstdint>
 
-#include "plugin/extract.h"
+#include "core/extract.h"
 
 namespace cairn {
 

@@ -1,7 +1,7 @@
 // Extraction methods that decode the stored bytes.
 #pragma once
 
-#include "plugin/extract.h"
+#include "core/extract.h"
 
 namespace cairn {
 

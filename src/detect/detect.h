@@ -10,7 +10,7 @@
 #include <span>
 #include <string_view>
 
-#include "plugin/session.h"
+#include "core/session.h"
 #include "util/bytes.h"
 #include "util/platform.h"
 

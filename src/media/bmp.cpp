@@ -8,9 +8,9 @@
 #include <string>
 #include <string_view>
 
+#include "core/stored.h"
 #include "media/media.h"
 #include "media/palettes.h"
-#include "plugin/stored.h"
 #include "util/names.h"
 
 namespace cairn {

@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <string_view>
 
-#include "plugin/session.h"
+#include "core/session.h"
 
 namespace cairn {
 

@@ -9,8 +9,8 @@
 #include <array>
 
 #include "codecs/codecs.h"
+#include "core/stored.h"
 #include "media/media.h"
-#include "plugin/stored.h"
 
 namespace cairn {
 namespace {

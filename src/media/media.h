@@ -8,7 +8,7 @@
 #include <utility>
 #include <vector>
 
-#include "plugin/extract.h"
+#include "core/extract.h"
 #include "util/bytes.h"
 
 namespace cairn {

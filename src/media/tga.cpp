@@ -8,9 +8,9 @@
 
 #include "codecs/inflate.h"
 #include "codecs/methods.h"
+#include "core/stored.h"
 #include "media/media.h"
 #include "media/palettes.h"
-#include "plugin/stored.h"
 
 namespace cairn {
 namespace {

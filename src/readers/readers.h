@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "plugin/session.h"
+#include "core/session.h"
 
 namespace cairn {
 

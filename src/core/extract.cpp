@@ -1,11 +1,9 @@
-#include "plugin/extract.h"
+#include "core/extract.h"
 
 #include <algorithm>
 #include <array>
 #include <exception>
 #include <vector>
-
-#include "plugin/registry.h"
 
 namespace cairn {
 namespace {
@@ -192,30 +190,6 @@ void RawCopy(ExtractionFrame& f) {
     CopyStored(f, f.entry.Offset, f.entry.PackedSize);
   if (f.session.format == 32) RestoreScrambledZip(f);
   if (f.session.format == 33) RestoreStrippedZip(f);
-}
-
-int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName) {
-  if (index >= s.entries.size() || !s.archive) return kBadData;
-  File output(os::CreateAlways(destName.c_str()));
-  if (!output) return kCreateFailed;
-  // A copy: a method may read other entries, but never changes the table.
-  const ArchiveEntry entry = s.entries[index];
-  ExtractionFrame f{s, entry, s.archive.get(), output.get(), destName};
-  int result = kOk;
-  try {
-    const FormatInfo* info = FindFormat(s.format);
-    const MethodFn method = info != nullptr ? info->method : RawCopy;
-    method(f);
-    f.Report(f.reportedSize);
-    os::SetTimes(output.get(), s.times);
-  } catch (const Aborted&) {
-    result = kAborted;
-  } catch (const std::exception&) {
-    result = kBadData;
-  }
-  output.Close();
-  if (result != kOk) os::Delete(destName.c_str());
-  return result;
 }
 
 }  // namespace cairn

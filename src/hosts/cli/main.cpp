@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "cli/commands.h"
+#include "hosts/cli/commands.h"
 
 #ifndef CAIRN_VERSION
 #define CAIRN_VERSION "unknown"

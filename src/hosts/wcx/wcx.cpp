@@ -2,7 +2,7 @@
 // walked by the host's cursor. ProcessFile works on the entry the last
 // ReadHeader returned and never moves the cursor, so a host that extracts
 // while it walks meets every entry exactly once.
-#include "plugin/wcx.h"
+#include "hosts/wcx/wcx.h"
 
 #include <algorithm>
 #include <cstring>
@@ -12,8 +12,9 @@
 #include <string>
 #include <utility>
 
-#include "plugin/extract.h"
-#include "plugin/session.h"
+#include "core/extract.h"
+#include "core/session.h"
+#include "formats/archive.h"
 
 namespace {
 

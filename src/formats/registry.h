@@ -4,8 +4,8 @@
 
 #include <span>
 
-#include "plugin/extract.h"
-#include "plugin/session.h"
+#include "core/extract.h"
+#include "core/session.h"
 
 namespace cairn {
 

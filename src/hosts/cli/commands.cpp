@@ -1,4 +1,4 @@
-#include "cli/commands.h"
+#include "hosts/cli/commands.h"
 
 #include <fmt/core.h>
 
@@ -14,11 +14,12 @@
 #include <string_view>
 #include <system_error>
 
-#include "cli/names.h"
+#include "core/extract.h"
+#include "core/session.h"
 #include "detect/detect.h"
-#include "plugin/extract.h"
-#include "plugin/registry.h"
-#include "plugin/session.h"
+#include "formats/archive.h"
+#include "formats/registry.h"
+#include "hosts/cli/names.h"
 
 namespace cairn::cli {
 namespace {

@@ -7,7 +7,7 @@
 #include <span>
 #include <vector>
 
-#include "plugin/extract.h"
+#include "core/extract.h"
 
 namespace cairn {
 

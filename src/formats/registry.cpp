@@ -1,4 +1,4 @@
-#include "plugin/registry.h"
+#include "formats/registry.h"
 
 #include <array>
 

@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <string>
 
-#include "plugin/session.h"
+#include "core/session.h"
 #include "util/bytes.h"
 
 namespace cairn {
@@ -40,10 +40,6 @@ void CopyStored(ExtractionFrame& f, uint32_t offset, uint32_t size);
 // The default method: the entry's stored bytes, with the per-format
 // transforms, composite entries and ZIP header repairs.
 void RawCopy(ExtractionFrame& f);
-
-// Extracts entry `index` of the open session to `destName`. Answers 0, 12, 16
-// or 21; after anything but 0 no output is left behind.
-int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName);
 
 // The 16 key words of the two sound-bank formats, applied by file position
 // modulo 16.

@@ -84,20 +84,7 @@ void SizesFromOffsets(ReaderContext& c, uint32_t end = 0);
 // Lays the entries back to back from `start`, in table order.
 void AssignSequentialOffsets(ReaderContext& c, uint32_t start);
 
-// Opens `path` into the session: recognition, the directory reader, the
-// table. Answers kOk or the host's open result (12, 14, 15, 18); on failure
-// the session holds nothing.
-int OpenArchiveSession(ArchiveSession& s, const std::string& path);
-
-// Opens `path` as FormatId `format`, skipping recognition (for formats that
-// recognition cannot reach, and for tests of one reader).
-int OpenArchiveAs(ArchiveSession& s, const std::string& path, FormatId format);
-
 // Ends the session: releases the table and closes the archive.
 void CloseArchiveSession(ArchiveSession& s);
-
-// Recognises the file at `path` without touching any session: the FormatId,
-// or 0 when the file is unknown or its format has no reader.
-FormatId RecogniseFile(const std::string& path);
 
 }  // namespace cairn

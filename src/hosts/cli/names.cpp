@@ -1,4 +1,4 @@
-#include "cli/names.h"
+#include "hosts/cli/names.h"
 
 #include <cstddef>
 

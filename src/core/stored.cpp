@@ -1,4 +1,4 @@
-#include "plugin/stored.h"
+#include "core/stored.h"
 
 #include "util/file.h"
 

@@ -7,7 +7,7 @@
 #include <cstdlib>
 #include <random>
 
-#include "fixtures.h"
+#include "samples.h"
 
 namespace cairn::test {
 namespace {
@@ -21,7 +21,7 @@ int MutantsPerFixture() {
 TEST(Mutation, DamagedArchivesAreAnsweredWithResultCodes) {
   std::mt19937 random(20261206);
   size_t opened = 0, refused = 0, extracted = 0, failed = 0;
-  for (const Fixture& f : AllFixtures()) {
+  for (const Sample& f : AllSamples()) {
     SCOPED_TRACE(f.label);
     for (int m = 0; m < MutantsPerFixture(); ++m) {
       Bytes bytes = f.bytes;
@@ -30,7 +30,9 @@ TEST(Mutation, DamagedArchivesAreAnsweredWithResultCodes) {
       for (size_t k = 0; k < changes; ++k) bytes[random() % bytes.size()] = random() & 0xFF;
       auto o = std::make_unique<Opened>();
       for (const auto& [name, companion] : f.companions) o->dir.write(name, companion);
-      const int r = OpenArchiveSession(o->session, o->dir.write(f.fileName, bytes));
+      const std::string path = o->dir.write(f.fileName, bytes);
+      const int r = f.recognised ? OpenArchiveSession(o->session, path)
+                                 : OpenArchiveAs(o->session, path, f.id);
       ASSERT_TRUE(r == kOk || r == kBadData || r == kUnknownFormat) << r;
       if (r != kOk) {
         ++refused;

@@ -20,7 +20,7 @@ ArchiveBuilder MhxHeader(uint32_t end) {
   return w;
 }
 
-Sample MhxSample() {
+ReaderSample MhxSample() {
   const Bytes a = Pattern(5, 1), b = Pattern(70, 2);
   const std::string full(48, 'N');  // fills its field: no terminator stored
   ArchiveBuilder w = MhxHeader(448 + 3 * 64);
@@ -43,7 +43,7 @@ ArchiveBuilder MageGoldHeader(uint32_t directory, uint32_t size) {
   return w;
 }
 
-Sample MageGoldSample() {
+ReaderSample MageGoldSample() {
   const Bytes a = Pattern(33, 3), b = Pattern(7, 4);
   const std::string full(56, 'm');
   ArchiveBuilder w = MageGoldHeader(104, 2 * 64 + 20);
@@ -61,7 +61,7 @@ ArchiveBuilder PffHeader(char version, uint32_t count, uint32_t recordSize, uint
   return w;
 }
 
-Sample PffSample(char version) {
+ReaderSample PffSample(char version) {
   const Bytes a = Pattern(10, 5), b = Pattern(100, 6);
   ArchiveBuilder w = PffHeader(version, 2, 32, 130);
   w.bytes(a).bytes(b);
@@ -80,7 +80,7 @@ ArchiveBuilder DirHeader(uint32_t end, uint32_t startLess4104 = 0) {
   return w;
 }
 
-Sample DirSample() {
+ReaderSample DirSample() {
   const Bytes a = Pattern(6, 7), b = Pattern(3000, 8);
   ArchiveBuilder w = DirHeader(4104 + 64);
   w.bytes(a).bytes(b).padTo(4104);
@@ -104,7 +104,7 @@ ArchiveBuilder FarHeader(uint32_t directory) {
   return w;
 }
 
-Sample FarSample() {
+ReaderSample FarSample() {
   const Bytes a = Pattern(20, 9), b = Pattern(33, 10);
   ArchiveBuilder w = FarHeader(69);
   w.bytes(a).bytes(b).u32(2);
@@ -129,7 +129,7 @@ ArchiveBuilder Dfp1Header(uint32_t start, uint32_t count, uint32_t end) {
   return w;
 }
 
-Sample Dfp1Sample() {
+ReaderSample Dfp1Sample() {
   const Bytes a = Pattern(40, 11), b = Pattern(50, 12);
   ArchiveBuilder w = Dfp1Header(119, 2, 157);
   w.bytes(a).bytes(b);
@@ -144,7 +144,7 @@ Sample Dfp1Sample() {
 
 // "CMPR": the directory ends 4 bytes past the word at 4; the word stored
 // there, plus 8, is its start.
-Sample CmprSample() {
+ReaderSample CmprSample() {
   const Bytes a = Pattern(50, 13), b = Pattern(17, 14);
   ArchiveBuilder w;
   w.text("CMPR").u32(115 - 4).bytes(a).bytes(b);
@@ -171,7 +171,7 @@ Bytes PvolArchive(const Bytes& data, const std::vector<std::string>& names,
   return w.get();
 }
 
-Sample PvolSample() {
+ReaderSample PvolSample() {
   const Bytes a = Pattern(25, 15), b = Pattern(12, 16);
   // The block starts at 45 and its names take 16 bytes: one byte of padding.
   return {"x.vol",
@@ -182,7 +182,7 @@ Sample PvolSample() {
 }
 
 TEST(InlineNames, EachFormatListsAndExtractsExactly) {
-  const std::pair<FormatId, Sample> samples[] = {
+  const std::pair<FormatId, ReaderSample> samples[] = {
       {kMhx, MhxSample()},     {kMageGold, MageGoldSample()}, {kPff2, PffSample('2')},
       {kPff3, PffSample('3')}, {kDir, DirSample()},           {kFar, FarSample()},
       {kDfp1, Dfp1Sample()},   {kCmpr, CmprSample()},         {kPvol, PvolSample()}};

@@ -15,7 +15,7 @@
 
 namespace cairn::test {
 
-struct Sample {
+struct ReaderSample {
   std::string fileName = "test.bin";
   Bytes bytes;
   std::vector<Listed> listing;
@@ -24,7 +24,7 @@ struct Sample {
 
 // Opens the sample as `format`, checks the listing exactly and extracts
 // every entry, comparing the bytes exactly.
-inline void ExpectSample(FormatId format, const Sample& s) {
+inline void ExpectSample(FormatId format, const ReaderSample& s) {
   auto o = OpenBytesAs(format, s.bytes, s.fileName);
   ASSERT_EQ(o->result, kOk);
   EXPECT_EQ(o->listing(), s.listing);
@@ -35,7 +35,7 @@ inline void ExpectSample(FormatId format, const Sample& s) {
 }
 
 // The same archive as a fixture, replayed through recognition.
-inline Fixture SampleFixture(std::string label, FormatId format, const Sample& s) {
+inline Fixture SampleFixture(std::string label, FormatId format, const ReaderSample& s) {
   Fixture f;
   f.label = std::move(label);
   f.id = format;

@@ -26,7 +26,7 @@ Bytes StoredZlib(const Bytes& data) {
 
 // A run-length stream of 90 bytes that decodes to "abczzzz": a literal run,
 // a repeat run, then runs of length 0 that produce nothing.
-Sample PackRleSample() {
+ReaderSample PackRleSample() {
   ArchiveBuilder w;
   w.text("PACK").u16(0).u32(7).u32(0).u8(0x83).text("abc").u8(0x04).text("z").fill(84);
   return {"level.pak",
@@ -45,7 +45,7 @@ Bytes NemoArchive(uint32_t compressed, const Bytes& part0, uint32_t unpacked0, c
   return w.get();
 }
 
-Sample NemoStoredSample() {
+ReaderSample NemoStoredSample() {
   const Bytes a = Pattern(30, 30), b = Pattern(20, 31);
   return {"movie.nfi",
           NemoArchive(0, a, 30, b, 20),
@@ -53,7 +53,7 @@ Sample NemoStoredSample() {
           {a, b}};
 }
 
-Sample NemoCompressedSample() {
+ReaderSample NemoCompressedSample() {
   const Bytes a = Pattern(30, 32), b = Pattern(20, 33);
   return {"movie.nfi",
           NemoArchive(7, StoredZlib(a), 30, StoredZlib(b), 20),
@@ -61,7 +61,7 @@ Sample NemoCompressedSample() {
           {a, b}};
 }
 
-Sample L33tSample() {
+ReaderSample L33tSample() {
   const Bytes data = Pattern(90, 34);
   return {"intro.dat",
           ArchiveBuilder().text("l33t").u32(90).bytes(StoredZlib(data)).get(),
@@ -71,7 +71,7 @@ Sample L33tSample() {
 
 // A 8 x 5 picture of 16-bit pixels: height 5 is the product of the words at
 // 8 and 16, bits per pixel the byte at 12.
-Sample AvixSample() {
+ReaderSample AvixSample() {
   const Bytes pixels = Pattern(80, 35);
   ArchiveBuilder w;
   w.text("AVIX").u32(8).u32(5).u8(16).fill(3, 0xAB).u32(1).padTo(24).bytes(pixels);
@@ -81,7 +81,7 @@ Sample AvixSample() {
 }
 
 // A literal 'a', then a match of distance 1 and length 10: eleven 'a'.
-Sample JdlzSample() {
+ReaderSample JdlzSample() {
   ArchiveBuilder w;
   w.text("JDLZ").u8(2).fill(3).u32(11).u32(16 + 5);
   w.u8(0x02).u8(0x01).text("a").u8(0x00).u8(0x07);
@@ -89,7 +89,7 @@ Sample JdlzSample() {
 }
 
 TEST(SingleStream, EachFormatListsAndExtractsExactly) {
-  const std::pair<FormatId, Sample> samples[] = {
+  const std::pair<FormatId, ReaderSample> samples[] = {
       {kPackRle, PackRleSample()}, {kNemo, NemoStoredSample()}, {kNemo, NemoCompressedSample()},
       {kL33t, L33tSample()},       {kAvix, AvixSample()},       {kJdlz, JdlzSample()}};
   for (const auto& [format, sample] : samples) {

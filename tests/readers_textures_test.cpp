@@ -34,7 +34,7 @@ void WadRecord(ArchiveBuilder& w, uint32_t offset, uint32_t size, std::string_vi
 }
 
 // "WAD2": a 4 x 2 picture, a lump that is no picture, a 0 x 0 picture.
-Sample Wad2Sample() {
+ReaderSample Wad2Sample() {
   const Bytes indices = {0, 1, 2, 3, 15, 14, 13, 12};
   const Bytes picture = ArchiveBuilder().u32(4).u32(2).bytes(indices).get();
   const Bytes other = Pattern(10, 20);
@@ -69,7 +69,7 @@ Bytes Wad3Tga(const Bytes& indices) {
 
 // "WAD3": a mip texture (pixels at 40), a plain picture (pixels at 8) and a
 // lump that is neither.
-Sample Wad3Sample() {
+ReaderSample Wad3Sample() {
   const Bytes indices = {5, 6, 7, 200};
   ArchiveBuilder mip;
   mip.name("brick", 16).u32(2).u32(2).u32(40).u32(44).u32(0).u32(0).bytes(indices);
@@ -94,7 +94,7 @@ Sample Wad3Sample() {
 
 // The "PACK" directory archive: a picture with its size at 0 and 4, one
 // with its size at 32 and 36, and a lump that is no picture.
-Sample PackSample() {
+ReaderSample PackSample() {
   const Bytes indices1 = {1, 2, 3, 4, 5, 6}, indices2 = {9, 8, 7, 6, 5, 4, 3, 2};
   const Bytes first = ArchiveBuilder().u32(3).u32(2).bytes(indices1).get();  // 14 bytes
   ArchiveBuilder second;                                                     // 108 bytes

@@ -18,7 +18,7 @@ trap 'rm -rf "$work"' EXIT
 fail() { echo "FAIL: $*"; exit 1; }
 winpath() { echo "Z:$1" | sed 's|/|\\|g'; }
 
-CAIRN_DUMP_FIXTURES="$work/fx" "$linux/tests/cairn_tests" --gtest_filter=Fixtures.DumpWhenAsked >/dev/null \
+CAIRN_DUMP_FIXTURES="$work/fx" "$linux/tests/cairn_tests" --gtest_filter=Samples.DumpWhenAsked >/dev/null \
   || fail "could not write the fixtures"
 archives=(); winarchives=()
 while read -r n name; do

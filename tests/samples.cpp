@@ -1,0 +1,93 @@
+#include "samples.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+
+#include "fixtures.h"
+
+namespace cairn::test {
+namespace {
+
+SampleTable RegisteredSamples() {
+  SampleTable all;
+  for (SampleMaker make : SampleMakers())
+    for (Sample& s : make()) all.push_back(std::move(s));
+  return all;
+}
+
+void ExpectListsAndExtracts(const Sample& s, Opened& o) {
+  EXPECT_EQ(o.listing(), s.listing);
+  ASSERT_EQ(s.data.size(), s.listing.size()) << "the row itself";
+  ASSERT_EQ(o.session.entries.size(), s.data.size());
+  for (size_t i = 0; i < s.data.size(); ++i)
+    EXPECT_EQ(o.extract(i), s.data[i]) << s.listing[i].name;
+}
+
+}  // namespace
+
+std::vector<SampleMaker>& SampleMakers() {
+  static std::vector<SampleMaker> makers;
+  return makers;
+}
+
+SampleTable AllSamples() {
+  SampleTable all = RegisteredSamples();
+  // Archives still registered the older way: names and bytes only.
+  for (const Fixture& f : AllFixtures()) {
+    Sample s{f.label, f.id, f.fileName, f.bytes, {}, {}, f.companions};
+    for (const ExpectedEntry& e : f.entries) {
+      s.listing.push_back({e.name, 0, 0, 0, 0, 0});
+      s.data.push_back(e.bytes);
+    }
+    all.push_back(std::move(s));
+  }
+  return all;
+}
+
+// Every row opens as its format, through recognition where recognition
+// reaches it and through its reader alone, lists exactly and extracts every
+// entry exactly.
+TEST(Samples, EachListsAndExtractsExactly) {
+  for (const Sample& s : RegisteredSamples()) {
+    SCOPED_TRACE(s.label);
+    auto direct = std::make_unique<Opened>();
+    for (const auto& [name, bytes] : s.companions) direct->dir.write(name, bytes);
+    const std::string path = direct->dir.write(s.fileName, s.bytes);
+    ASSERT_EQ(OpenArchiveAs(direct->session, path, s.id), kOk);
+    ExpectListsAndExtracts(s, *direct);
+    if (!s.recognised) continue;
+    auto o = std::make_unique<Opened>();
+    ASSERT_EQ(OpenArchiveSession(o->session, path), kOk);
+    EXPECT_EQ(o->session.format, s.id);
+    ExpectListsAndExtracts(s, *o);
+  }
+}
+
+// Writes every sample that recognition reaches to the folder
+// CAIRN_DUMP_FIXTURES names, for the hosts that run outside this test binary:
+// folder N holds the archive and its companions, and list.txt has a line
+// "N FILENAME" for each.
+TEST(Samples, DumpWhenAsked) {
+  const char* root = std::getenv("CAIRN_DUMP_FIXTURES");
+  if (root == nullptr) GTEST_SKIP() << "CAIRN_DUMP_FIXTURES is not set";
+  std::filesystem::create_directories(root);
+  std::ofstream list(std::filesystem::path(root) / "list.txt");
+  const auto write = [](const std::filesystem::path& p, const Bytes& b) {
+    std::ofstream(p, std::ios::binary)
+        .write(reinterpret_cast<const char*>(b.data()), static_cast<std::streamsize>(b.size()));
+  };
+  int n = 0;
+  for (const Sample& s : AllSamples()) {
+    if (!s.recognised) continue;
+    const auto dir = std::filesystem::path(root) / std::to_string(n);
+    std::filesystem::create_directories(dir);
+    for (const auto& [name, bytes] : s.companions) write(dir / name, bytes);
+    write(dir / s.fileName, s.bytes);
+    list << n++ << ' ' << s.fileName << '\n';
+  }
+}
+
+}  // namespace cairn::test

@@ -1,0 +1,45 @@
+// The table of sample archives: one row per archive, built in code, with the
+// exact listing it must give and the exact bytes of every entry. One test
+// walks the table through recognition and through each reader; the same rows
+// are replayed through the plug-in as a file manager loads it, the
+// command-line tool, Wine and the mutation test.
+#pragma once
+
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "builder.h"
+
+namespace cairn::test {
+
+struct Sample {
+  std::string label;
+  FormatId id = 0;
+  std::string fileName = "test.bin";  // recognition may look at the extension
+  Bytes bytes;
+  std::vector<Listed> listing;                                 // the whole listing, in order
+  std::vector<Bytes> data;                                     // what extracting each entry writes
+  std::vector<std::pair<std::string, Bytes>> companions = {};  // files beside it
+  bool recognised = true;  // false where recognition cannot reach the format
+};
+
+using SampleTable = std::vector<Sample>;
+using SampleMaker = SampleTable (*)();
+std::vector<SampleMaker>& SampleMakers();
+
+// Every registered sample, in registration order.
+SampleTable AllSamples();
+
+struct SampleRegistrar {
+  explicit SampleRegistrar(SampleMaker make) { SampleMakers().push_back(make); }
+};
+
+}  // namespace cairn::test
+
+// Defines a function that returns rows of the sample table and registers it:
+//   CAIRN_SAMPLES(NameBlockSamples) { return {{"AFS archive", 9, ...}, ...}; }
+#define CAIRN_SAMPLES(name)                                           \
+  static ::cairn::test::SampleTable name();                           \
+  static const ::cairn::test::SampleRegistrar name##Registrar(&name); \
+  static ::cairn::test::SampleTable name()

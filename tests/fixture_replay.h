@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include "fixtures.h"
+#include "samples.h"
 
 namespace cairn::test {
 
@@ -19,14 +20,6 @@ inline void ReplayFixture(const Fixture& f) {
     EXPECT_EQ(o->session.entries[i].Name, name);
     EXPECT_EQ(o->extract(i), f.entries[i].bytes) << name;
   }
-}
-
-// An archive the reader must refuse: OpenResult 12 and no session left.
-inline void ExpectRefused(FormatId id, const Bytes& bytes, std::string_view fileName = "test.bin") {
-  auto o = OpenBytesAs(id, bytes, fileName);
-  EXPECT_EQ(o->result, kBadData);
-  EXPECT_TRUE(o->session.entries.empty());
-  EXPECT_FALSE(o->session.archive);
 }
 
 }  // namespace cairn::test

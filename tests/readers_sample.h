@@ -62,21 +62,6 @@ inline void ExpectListings(const std::vector<ListingCase>& cases) {
   }
 }
 
-// An archive that opening as `format` refuses: the error exit, nothing
-// listed.
-struct RefusedCase {
-  const char* what;
-  FormatId format;
-  Bytes bytes;
-};
-
-inline void ExpectRefused(const std::vector<RefusedCase>& cases) {
-  for (const RefusedCase& k : cases) {
-    SCOPED_TRACE(k.what);
-    ExpectRefused(k.format, k.bytes);
-  }
-}
-
 // `bytes` made at least `size` long with zeros.
 inline Bytes Padded(ArchiveBuilder w, size_t size = kHeaderSize) {
   return w.padTo(size).get();

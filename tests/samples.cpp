@@ -47,6 +47,20 @@ SampleTable AllSamples() {
   return all;
 }
 
+void ExpectRefused(FormatId format, const Bytes& bytes, std::string_view fileName) {
+  auto o = OpenBytesAs(format, bytes, fileName);
+  EXPECT_EQ(o->result, kBadData);
+  EXPECT_TRUE(o->session.entries.empty());
+  EXPECT_FALSE(o->session.archive);
+}
+
+void ExpectRefused(const std::vector<RefusedCase>& cases) {
+  for (const RefusedCase& k : cases) {
+    SCOPED_TRACE(k.what);
+    ExpectRefused(k.format, k.bytes);
+  }
+}
+
 // Every row opens as its format, through recognition where recognition
 // reaches it and through its reader alone, lists exactly and extracts every
 // entry exactly.

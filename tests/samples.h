@@ -6,6 +6,7 @@
 #pragma once
 
 #include <string>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -30,6 +31,18 @@ std::vector<SampleMaker>& SampleMakers();
 
 // Every registered sample, in registration order.
 SampleTable AllSamples();
+
+// An archive that opening as `format` must refuse: OpenResult 12, no table
+// and no open file left.
+void ExpectRefused(FormatId format, const Bytes& bytes, std::string_view fileName = "test.bin");
+
+// Refusals grouped in a table, each traced by what it shows.
+struct RefusedCase {
+  const char* what;
+  FormatId format;
+  Bytes bytes;
+};
+void ExpectRefused(const std::vector<RefusedCase>& cases);
 
 struct SampleRegistrar {
   explicit SampleRegistrar(SampleMaker make) { SampleMakers().push_back(make); }

@@ -39,6 +39,20 @@ Bytes Compress(const Bytes& data, int level) {
   return out;
 }
 
+Bytes Pwad(const std::vector<std::pair<std::string, Bytes>>& lumps) {
+  ArchiveBuilder b;
+  b.text("PWAD").u32(static_cast<uint32_t>(lumps.size())).u32(0);
+  std::vector<uint32_t> at;
+  for (const auto& [name, data] : lumps) {
+    at.push_back(static_cast<uint32_t>(b.size()));
+    b.bytes(data);
+  }
+  b.padTo(104).patch32(8, static_cast<uint32_t>(b.size()));
+  for (size_t i = 0; i < lumps.size(); ++i)
+    b.u32(at[i]).u32(static_cast<uint32_t>(lumps[i].second.size())).name(lumps[i].first, 8);
+  return b.get();
+}
+
 Bytes ReadFile(const std::string& path) {
   std::ifstream f(path, std::ios::binary);
   return Bytes(std::istreambuf_iterator<char>(f), std::istreambuf_iterator<char>());

@@ -9,11 +9,12 @@
 #include <memory>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "core/extract.h"
-#include "formats/archive.h"
 #include "core/session.h"
+#include "formats/archive.h"
 
 namespace cairn::test {
 
@@ -87,6 +88,10 @@ inline Bytes Slice(const Bytes& b, size_t at, size_t n) {
   return Bytes(b.begin() + static_cast<std::ptrdiff_t>(at),
                b.begin() + static_cast<std::ptrdiff_t>(at + n));
 }
+
+// A "PWAD" lump archive: count at 4, directory offset at 8, the lumps, zeros
+// up to 104 bytes, then records of offset, size and an 8-byte name.
+Bytes Pwad(const std::vector<std::pair<std::string, Bytes>>& lumps);
 
 // A fresh folder under the system's temporary folder, removed afterwards.
 class TempDir {

@@ -134,23 +134,7 @@ int64_t MTime(const std::string& path) {
   return st.st_mtim.tv_sec;
 }
 
-// A "PWAD" lump archive: count at 4, directory offset at 8, records of
-// offset, size and an 8-byte name.
-Bytes Pwad(const std::vector<std::pair<std::string, Bytes>>& lumps, uint32_t extraBadOffset = 0) {
-  test::ArchiveBuilder a;
-  a.text("PWAD").u32(static_cast<uint32_t>(lumps.size() + (extraBadOffset ? 1 : 0))).u32(0);
-  std::vector<uint32_t> at;
-  for (const auto& [name, data] : lumps) {
-    at.push_back(static_cast<uint32_t>(a.size()));
-    a.bytes(data);
-  }
-  a.padTo(104);
-  a.patch32(8, static_cast<uint32_t>(a.size()));
-  for (size_t i = 0; i < lumps.size(); ++i)
-    a.u32(at[i]).u32(static_cast<uint32_t>(lumps[i].second.size())).name(lumps[i].first, 8);
-  if (extraBadOffset) a.u32(extraBadOffset).u32(10).name("BROKEN", 8);
-  return a.get();
-}
+using test::Pwad;
 
 TEST(PluginHost, AnswersItsCapabilitiesAndHandlesOnlyWhatItRecognises) {
   const Plugin& p = Loaded();
@@ -246,8 +230,11 @@ TEST(PluginHost, ExtractingWhileWalkingMeetsEveryEntryOnce) {
 
 TEST(PluginHost, AFailedOrStoppedExtractionLeavesNothingAndTheWalkGoesOn) {
   test::TempDir dir;
-  const std::string path =
-      dir.write("broken.wad", Pwad({{"A", test::Pattern(30)}, {"B", test::Pattern(20)}}, 9999));
+  // A third record whose data lies past the end of the file.
+  test::ArchiveBuilder broken;
+  broken.bytes(Pwad({{"A", test::Pattern(30)}, {"B", test::Pattern(20)}})).patch32(4, 3);
+  broken.u32(9999).u32(10).name("BROKEN", 8);
+  const std::string path = dir.write("broken.wad", broken.get());
   g_reports.clear();
   g_stopAtReport = 1;  // the first chunk of the first entry asks to stop
   const Walk w = HostWalk(path, dir);

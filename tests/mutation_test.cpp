@@ -1,10 +1,12 @@
-// Every example archive, with a few of its bytes changed, many times over:
-// recognition, the readers and the methods must answer with a result code,
-// never crash, hang or leave an output behind after a failure. Run it under
-// the sanitizers (tools/sanitize.sh) to catch reads outside a buffer.
+// Every sample archive, and the real game archives when their packages are
+// installed, with a few of their bytes changed, many times over: recognition,
+// the readers and the methods must answer with a result code, never crash,
+// hang or leave an output behind after a failure. Run it under the
+// sanitizers (tools/sanitize.sh) to catch reads outside a buffer.
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <filesystem>
 #include <random>
 
 #include "samples.h"
@@ -12,43 +14,65 @@
 namespace cairn::test {
 namespace {
 
-// CAIRN_MUTANTS sets how many mutants each fixture gets (60 by default).
-int MutantsPerFixture() {
+// CAIRN_MUTANTS sets how many mutants each sample gets (60 by default).
+int MutantsPerSample() {
   const char* n = std::getenv("CAIRN_MUTANTS");
   return n != nullptr ? std::atoi(n) : 60;
 }
 
+struct Tally {
+  size_t opened = 0, refused = 0, extracted = 0, failed = 0;
+};
+
+// Opens `bytes` changed at `changes` positions that `where` picks, and
+// extracts its first 64 entries.
+template <typename Where>
+void Mutant(const Sample& s, Bytes bytes, size_t changes, Where where, std::mt19937& random,
+            Tally& t) {
+  for (size_t k = 0; k < changes; ++k) bytes[where()] = random() & 0xFF;
+  auto o = std::make_unique<Opened>();
+  for (const auto& [name, companion] : s.companions) o->dir.write(name, companion);
+  const std::string path = o->dir.write(s.fileName, bytes);
+  const int r =
+      s.recognised ? OpenArchiveSession(o->session, path) : OpenArchiveAs(o->session, path, s.id);
+  ASSERT_TRUE(r == kOk || r == kBadData || r == kUnknownFormat) << r;
+  ++(r == kOk ? t.opened : t.refused);
+  for (size_t i = 0; r == kOk && i < o->session.entries.size() && i < 64; ++i) {
+    Bytes out;
+    const int e = o->extract(i, out);  // checks that a failure leaves no file
+    ASSERT_TRUE(e == kOk || e == kBadData) << e;
+    ++(e == kOk ? t.extracted : t.failed);
+  }
+}
+
 TEST(Mutation, DamagedArchivesAreAnsweredWithResultCodes) {
   std::mt19937 random(20261206);
-  size_t opened = 0, refused = 0, extracted = 0, failed = 0;
-  for (const Sample& f : AllSamples()) {
-    SCOPED_TRACE(f.label);
-    for (int m = 0; m < MutantsPerFixture(); ++m) {
-      Bytes bytes = f.bytes;
-      // Under 1% of the bytes, at least one, each set to a random value.
-      const size_t changes = 1 + random() % std::max<size_t>(1, bytes.size() / 100);
-      for (size_t k = 0; k < changes; ++k) bytes[random() % bytes.size()] = random() & 0xFF;
-      auto o = std::make_unique<Opened>();
-      for (const auto& [name, companion] : f.companions) o->dir.write(name, companion);
-      const std::string path = o->dir.write(f.fileName, bytes);
-      const int r = f.recognised ? OpenArchiveSession(o->session, path)
-                                 : OpenArchiveAs(o->session, path, f.id);
-      ASSERT_TRUE(r == kOk || r == kBadData || r == kUnknownFormat) << r;
-      if (r != kOk) {
-        ++refused;
-        continue;
-      }
-      ++opened;
-      for (size_t i = 0; i < o->session.entries.size() && i < 64; ++i) {
-        Bytes out;
-        const int e = o->extract(i, out);  // checks that a failure leaves no file
-        ASSERT_TRUE(e == kOk || e == kBadData) << e;
-        ++(e == kOk ? extracted : failed);
-      }
-    }
+  Tally t;
+  for (const Sample& s : AllSamples()) {
+    SCOPED_TRACE(s.label);
+    // Under 1% of the bytes, at least one, each set to a random value.
+    const size_t size = s.bytes.size();
+    for (int m = 0; m < MutantsPerSample(); ++m)
+      Mutant(
+          s, s.bytes, 1 + random() % std::max<size_t>(1, size / 100),
+          [&] { return random() % size; }, random, t);
   }
-  std::printf("mutants opened %zu, refused %zu; entries extracted %zu, failed %zu\n", opened,
-              refused, extracted, failed);
+  // The real archives keep their directories at the end: the changes fall
+  // in the header and in the last 64 KiB.
+  for (const char* real :
+       {"/usr/share/games/doom/freedoom2.wad", "/usr/share/games/doom/freedm.wad",
+        "/usr/share/games/quake/quakespasm.pak"}) {
+    if (!std::filesystem::exists(real)) continue;
+    SCOPED_TRACE(real);
+    const Sample s{real, 0, std::filesystem::path(real).filename(), ReadFile(real)};
+    const size_t size = s.bytes.size(), tail = std::min<size_t>(size, 65536);
+    for (int m = 0; m < std::max(1, MutantsPerSample() / 10); ++m)
+      Mutant(
+          s, s.bytes, 1 + random() % 8,
+          [&] { return random() % 2 ? random() % 12 : size - 1 - random() % tail; }, random, t);
+  }
+  std::printf("mutants opened %zu, refused %zu; entries extracted %zu, failed %zu\n", t.opened,
+              t.refused, t.extracted, t.failed);
 }
 
 }  // namespace

@@ -29,48 +29,46 @@ struct Reports {
   }
 };
 
-TEST(RawCopy, AnEmptyEntryGivesAnEmptyFileAndOneReportOfZero) {
-  auto o = SessionOver(15, Pattern(200), {Entry(50, 0)});
-  Reports r;
-  r.attach(o->session);
-  EXPECT_EQ(o->extract(0), Bytes{});
-  EXPECT_EQ(r.sizes, std::vector<uint32_t>{0});
-}
-
-TEST(RawCopy, CopiesInChunksOfOneMiBEachReportedThenTheTotal) {
-  const Bytes data = Pattern(3000100);
-  auto o = SessionOver(15, data, {Entry(100, 3000000)});
-  Reports r;
-  r.attach(o->session);
-  EXPECT_EQ(o->extract(0), test::Slice(data, 100, 3000000));
-  EXPECT_EQ(r.sizes, (std::vector<uint32_t>{1048576, 1048576, 902848, 3000000}));
-}
-
-TEST(RawCopy, AnEntryRunningPastTheEndIsBadDataAndLeavesNoFile) {
-  auto o = SessionOver(15, Pattern(200), {Entry(150, 51), Entry(0xFFFFFFF0u, 4)});
-  Bytes out;
-  EXPECT_EQ(o->extract(0, out), kBadData);
-  EXPECT_EQ(o->extract(1, out), kBadData);
-}
-
-TEST(RawCopy, AStopAskedDuringTheCopyOrAtTheEndAbortsAndLeavesNoFile) {
-  auto o = SessionOver(15, Pattern(2100000), {Entry(0, 2100000)});
-  Reports during;
-  during.stopAt = 2;
-  during.attach(o->session);
-  Bytes out;
-  EXPECT_EQ(o->extract(0, out), kAborted);
-  EXPECT_EQ(during.sizes.size(), 2u);
-
-  Reports atEnd;
-  atEnd.stopAt = 4;  // three chunks, then the final report
-  atEnd.attach(o->session);
-  EXPECT_EQ(o->extract(0, out), kAborted);
-}
-
-TEST(RawCopy, AnUnsetCallbackDoesNotStopTheCopy) {
-  auto o = SessionOver(15, Pattern(300), {Entry(10, 20)});
-  EXPECT_EQ(o->extract(0), test::Slice(Pattern(300), 10, 20));
+// Each case: the stored bytes, one entry, the stop the callback asks for;
+// the result, the bytes written and the reports made.
+TEST(RawCopy, CopiesInChunksReportsEachAndEndsInOneOfThreeWays) {
+  const Bytes big = Pattern(3000100);
+  struct Case {
+    const char* what;
+    Bytes stored;
+    ArchiveEntry entry;
+    size_t stopAt;
+    int result;
+    Bytes written;
+    std::vector<uint32_t> reports;
+  };
+  const Case cases[] = {
+      {"empty", Pattern(200), Entry(50, 0), SIZE_MAX, kOk, {}, {0}},
+      {"three chunks",
+       big,
+       Entry(100, 3000000),
+       SIZE_MAX,
+       kOk,
+       test::Slice(big, 100, 3000000),
+       {1048576, 1048576, 902848, 3000000}},
+      {"past the end", Pattern(200), Entry(150, 51), SIZE_MAX, kBadData, {}, {}},
+      {"offset wraps", Pattern(200), Entry(0xFFFFFFF0u, 4), SIZE_MAX, kBadData, {}, {}},
+      {"stop during", big, Entry(0, 3000000), 2, kAborted, {}, {1048576, 1048576}},
+      {"stop at the end", big, Entry(0, 10), 2, kAborted, {}, {10, 10}},
+  };
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.what);
+    auto o = SessionOver(15, c.stored, {c.entry});
+    Reports r;
+    r.stopAt = c.stopAt;
+    r.attach(o->session);
+    Bytes out;
+    EXPECT_EQ(o->extract(0, out), c.result);
+    EXPECT_EQ(out, c.written);
+    EXPECT_EQ(r.sizes, c.reports);
+  }
+  // No callback set: nothing stops the copy.
+  EXPECT_EQ(SessionOver(15, big, {Entry(10, 20)})->extract(0), test::Slice(big, 10, 20));
 }
 
 TEST(RawCopy, TheOutputCarriesTheArchiveTimesAndOverwritesAnExistingFile) {
@@ -85,13 +83,10 @@ TEST(RawCopy, TheOutputCarriesTheArchiveTimesAndOverwritesAnExistingFile) {
   EXPECT_EQ(st.st_mtim.tv_nsec, 500);
   EXPECT_EQ(st.st_atim.tv_sec, 1500000000);
   EXPECT_EQ(test::ReadFile(dest), test::Slice(Pattern(300), 10, 20));
-}
-
-TEST(RawCopy, AnOutputThatCannotBeCreatedIsReportedAsSuch) {
-  auto o = SessionOver(15, Pattern(300), {Entry(10, 20)});
+  // An output that cannot be created, and an entry that does not exist.
   EXPECT_EQ(ExtractEntry(o->session, 0, o->dir.path("no/such/folder/x")), kCreateFailed);
   EXPECT_EQ(ExtractEntry(o->session, 0, o->dir.dir().string()), kCreateFailed);
-  EXPECT_EQ(ExtractEntry(o->session, 7, o->dir.path("x")), kBadData);  // no such entry
+  EXPECT_EQ(ExtractEntry(o->session, 7, o->dir.path("x")), kBadData);
   EXPECT_FALSE(test::Exists(o->dir.path("x")));
 }
 

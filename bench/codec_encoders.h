@@ -1,6 +1,6 @@
 // Simple greedy encoders for the three decoders, and generated data to feed
-// them: the round-trip tests and the benchmarks share them. They aim at valid
-// streams of a reasonable ratio, not at the best one.
+// them, for the benchmarks. They aim at valid streams of a reasonable ratio,
+// not at the best one.
 #pragma once
 
 #include <algorithm>

@@ -107,15 +107,6 @@ TEST(RawCopy, XorTransformsFollowTheFormatAndTheFlag) {
   EXPECT_EQ(SessionOver(15, data, {Entry(8, 40, 0x6B)})->extract(0), part);
 }
 
-TEST(PositionKey, DeciphersTheSignaturesOfTheTwoSoundBanks) {
-  const uint32_t row65[2] = {0x5E3BC515, 0xF314A89A};
-  const uint32_t row66[2] = {0xA1C47D72, 0xF314A89E};
-  EXPECT_EQ(row65[0] ^ kPositionKeyTable[0], 0xFFFFFFFFu);
-  EXPECT_EQ(row65[1] ^ kPositionKeyTable[4], 0u);
-  EXPECT_EQ(row66[0] ^ kPositionKeyTable[0], 0x4798u);
-  EXPECT_EQ(row66[1] ^ kPositionKeyTable[4], 4u);
-}
-
 // Enciphers as the sound banks store their data: each little-endian word at
 // archive position p XOR key word p mod 16.
 Bytes Encipher(Bytes b, uint32_t position) {

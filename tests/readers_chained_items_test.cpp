@@ -2,21 +2,10 @@
 // "MNA" (28), "1XFG" (40) and "ACTRHEAD" (45).
 #include <gtest/gtest.h>
 
-#include <tuple>
-
 #include "samples.h"
 
 namespace cairn::test {
 namespace {
-
-// A row whose entries are all stored as they are: (listed name, offset, bytes).
-Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries) {
-  for (const auto& [name, offset, data] : entries) {
-    s.listing.push_back({name, offset, uint32_t(data.size()), uint32_t(data.size()), 0, 0});
-    s.data.push_back(data);
-  }
-  return s;
-}
 
 CAIRN_SAMPLES(ChainedItemSamples) {
   const Bytes a = Pattern(20, 3), b = Pattern(300, 9), c = Pattern(9, 40), pic = Pattern(1298, 7);

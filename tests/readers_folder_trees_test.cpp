@@ -2,23 +2,12 @@
 // readers: "DATOS" (21), the typed resource archive (25) and "GSCfmt" (26).
 #include <gtest/gtest.h>
 
-#include <tuple>
-
 #include "samples.h"
 
 namespace cairn::test {
 namespace {
 
 constexpr uint32_t kFolder = 0xCDCDCD01, kEnd = 0xCDCDCDFF;
-
-// A row whose entries are all stored as they are: (listed name, offset, bytes).
-Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries) {
-  for (const auto& [name, offset, data] : entries) {
-    s.listing.push_back({name, offset, uint32_t(data.size()), uint32_t(data.size()), 0, 0});
-    s.data.push_back(data);
-  }
-  return s;
-}
 
 // A "DATOS" record: a 32-byte name, the kind, the size, the offset (or folder's list).
 ArchiveBuilder& Record(ArchiveBuilder& w, std::string_view name, uint32_t kind, uint32_t size,

@@ -2,21 +2,10 @@
 // V1.0", "DIR", "FAR!byAZ", "MageGold", "DFP1", "PFF2", "PFF3", "CMPR", "PVOL".
 #include <gtest/gtest.h>
 
-#include <tuple>
-
 #include "samples.h"
 
 namespace cairn::test {
 namespace {
-
-// A row whose entries are all stored as they are: (listed name, offset, bytes).
-Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries) {
-  for (const auto& [name, offset, data] : entries) {
-    s.listing.push_back({name, offset, uint32_t(data.size()), uint32_t(data.size()), 0, 0});
-    s.data.push_back(data);
-  }
-  return s;
-}
 
 CAIRN_SAMPLES(InlineNameSamples) {
   const Bytes a = Pattern(5, 1), b = Pattern(70, 2);

@@ -2,21 +2,10 @@
 // "archive  V2.2" (13), "StOR" (14), "HAK V1.0" (29) and "DWFB" (31).
 #include <gtest/gtest.h>
 
-#include <tuple>
-
 #include "samples.h"
 
 namespace cairn::test {
 namespace {
-
-// A row whose entries are all stored as they are: (listed name, offset, bytes).
-Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries) {
-  for (const auto& [name, offset, data] : entries) {
-    s.listing.push_back({name, offset, uint32_t(data.size()), uint32_t(data.size()), 0, 0});
-    s.data.push_back(data);
-  }
-  return s;
-}
 
 CAIRN_SAMPLES(NameBlockSamples) {
   const Bytes a = Pattern(5, 1), b = Pattern(70, 2), c = Pattern(10, 3);

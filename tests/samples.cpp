@@ -47,6 +47,14 @@ SampleTable AllSamples() {
   return all;
 }
 
+Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries) {
+  for (const auto& [name, offset, data] : entries) {
+    s.listing.push_back({name, offset, uint32_t(data.size()), uint32_t(data.size()), 0, 0});
+    s.data.push_back(data);
+  }
+  return s;
+}
+
 void ExpectRefused(FormatId format, const Bytes& bytes, std::string_view fileName) {
   auto o = OpenBytesAs(format, bytes, fileName);
   EXPECT_EQ(o->result, kBadData);

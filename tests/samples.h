@@ -7,6 +7,7 @@
 
 #include <string>
 #include <string_view>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -31,6 +32,10 @@ std::vector<SampleMaker>& SampleMakers();
 
 // Every registered sample, in registration order.
 SampleTable AllSamples();
+
+// The row `s` with entries that are all stored as they are, each given as
+// (listed name, offset, bytes).
+Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries);
 
 // An archive that opening as `format` must refuse: OpenResult 12, no table
 // and no open file left.

@@ -6,17 +6,8 @@
 #include <filesystem>
 #include <fstream>
 
-#include "fixtures.h"
-
 namespace cairn::test {
 namespace {
-
-SampleTable RegisteredSamples() {
-  SampleTable all;
-  for (SampleMaker make : SampleMakers())
-    for (Sample& s : make()) all.push_back(std::move(s));
-  return all;
-}
 
 void ExpectListsAndExtracts(const Sample& s, Opened& o) {
   EXPECT_EQ(o.listing(), s.listing);
@@ -34,16 +25,9 @@ std::vector<SampleMaker>& SampleMakers() {
 }
 
 SampleTable AllSamples() {
-  SampleTable all = RegisteredSamples();
-  // Archives still registered the older way: names and bytes only.
-  for (const Fixture& f : AllFixtures()) {
-    Sample s{f.label, f.id, f.fileName, f.bytes, {}, {}, f.companions};
-    for (const ExpectedEntry& e : f.entries) {
-      s.listing.push_back({e.name, 0, 0, 0, 0, 0});
-      s.data.push_back(e.bytes);
-    }
-    all.push_back(std::move(s));
-  }
+  SampleTable all;
+  for (SampleMaker make : SampleMakers())
+    for (Sample& s : make()) all.push_back(std::move(s));
   return all;
 }
 
@@ -73,7 +57,7 @@ void ExpectRefused(const std::vector<RefusedCase>& cases) {
 // reaches it and through its reader alone, lists exactly and extracts every
 // entry exactly.
 TEST(Samples, EachListsAndExtractsExactly) {
-  for (const Sample& s : RegisteredSamples()) {
+  for (const Sample& s : AllSamples()) {
     SCOPED_TRACE(s.label);
     auto direct = std::make_unique<Opened>();
     for (const auto& [name, bytes] : s.companions) direct->dir.write(name, bytes);

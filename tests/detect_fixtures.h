@@ -3,8 +3,8 @@
 // hosts that report it.
 #pragma once
 
+#include <initializer_list>
 #include <string>
-#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -14,16 +14,20 @@ namespace cairn::test {
 
 struct DetectCase {
   FormatId id;
-  std::string fileName;
+  std::string fileName;                                   // empty: recognised without a path
   Bytes bytes;                                            // at least 104 bytes
   std::vector<std::pair<std::string, Bytes>> companions;  // files beside it
 };
 
-// Every id from 1 to 157 except 70, 91 and 130, which no header reaches, in
-// ascending order.
+// Every id from 1 to 157 except 70, 91 and 130, in ascending order.
 std::vector<DetectCase> DetectCases();
 
-// Bytes written as hexadecimal pairs separated by spaces: "50 41 43 4B".
-Bytes FromHex(std::string_view hex);
+// The builder's bytes padded with zeros to `n`, a whole header by default.
+inline Bytes Header(ArchiveBuilder b, size_t n = kHeaderSize) {
+  return b.padTo(n).get();
+}
+
+// "AAAA" (a first word no rule takes) and zeros, with 32-bit words at offsets.
+Bytes Words(std::initializer_list<std::pair<size_t, uint32_t>> words, size_t size = kHeaderSize);
 
 }  // namespace cairn::test

@@ -1,9 +1,7 @@
-// One minimal file for every FormatId that recognition can reach, with the
-// name and companion files it needs, for the tests of recognition and of the
-// hosts that report it.
+// One minimal file for every FormatId that recognition can reach, with its name
+// and companions, for the tests of recognition and of the hosts that report it.
 #pragma once
 
-#include <initializer_list>
 #include <string>
 #include <utility>
 #include <vector>

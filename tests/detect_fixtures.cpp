@@ -22,7 +22,7 @@ std::vector<DetectCase> DetectCases() {
   };
   std::vector<DetectCase> v;
   for (const Signature& s : SignatureTable())
-    if (s.id != 70) v.push_back({s.id, "a.res", Header(B().text(s.magic))});
+    if (!s.magic.empty()) v.push_back({s.id, "a.res", Header(B().text(s.magic))});
   const std::vector<DetectCase> rules = {
       {80, "a.res", Header(B().u32(0x20030507))},
       {81, "a.res", Header(B().u32(0xFFFFFFFF).u32(0).u32(0).u32(80))},

@@ -46,7 +46,7 @@ const std::map<FormatId, std::vector<size_t>> kCounted = {
 // clang-format on
 
 TEST(Detect, EachFormatAndTheBytesItNeeds) {
-  FormatId next = 1;  // ascending, every id but 70, 91 and 130
+  FormatId next = 1;  // ascending, every id but 70 (see kRows), 91 and 130
   for (const DetectCase& c : DetectCases()) {
     SCOPED_TRACE(std::to_string(c.id) + " " + c.fileName);
     EXPECT_EQ(c.id, next);
@@ -67,7 +67,30 @@ TEST(Detect, EachFormatAndTheBytesItNeeds) {
 const Bytes kPlain = Words({});
 const Bytes kP154 = Words({{32, 0x99A1A220}, {36, 0x99A1A220}, {40, 0x99A1A220}, {44, 0x99A1A220}});
 
+// 256 bytes: "PACK", a directory of `length` bytes at `at`, its records naming
+// 4-byte entries at `entry`.
+Bytes Pack(uint32_t at, uint32_t length, std::vector<std::string> names, uint32_t entry = 12) {
+  B b = B().text("PACK").u32(at).u32(length).padTo(at);
+  for (const std::string& name : names) b.name(name, 56).u32(entry).u32(4);
+  return Header(b, 256);
+}
+
 const DetectCase kRows[] = {
+    // "PACK" is a directory archive when its header describes a readable directory.
+    {70, "a.res", Pack(192, 64, {" a~"}, 252)},  // both end where the file ends
+    {70, "a.res", Pack(16, 128, {"a", "b"})},
+    {7, "a.res", Pack(16, 128, {"a", "b\x1F"})},  // the second record counts too
+    {7, "a.res", Pack(8, 64, {"a"})},
+    {7, "a.res", Pack(16, 0, {"a"})},
+    {7, "a.res", Pack(16, 100, {"a", "b"})},
+    {7, "a.res", Pack(192, 128, {"a"})},  // the file is too short for it
+    {7, "a.res", Header(B().text("PACK").u32(0xFFFFFFC0).u32(64))},
+    {7, "a.res", Pack(16, 64, {""})},
+    {7, "a.res", Pack(16, 64, {std::string(56, 'n')})},
+    {7, "a.res", Pack(16, 64, {"a\x7F"})},
+    {7, "a.res", Pack(16, 64, {"a"}, 253)},
+    {7, "a.res", Pack(16, 64, {"a"}, 0xFFFFFFFE)},
+    {7, "a.res", Header(B().text("PACK").u16(0).u32(5))},  // "PACK" 00 00 alone is no directory
     // The first signature or rule that holds decides, extensions and companions last.
     {5, "a.img", Header(B().text("WAD3")), {{"a.dir", Pattern(8)}}},
     {146, "a.img", Words({{0, 0}, {4, 3}, {44, 4}}), {{"a.dir", Pattern(8)}}},

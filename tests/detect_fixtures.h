@@ -1,10 +1,8 @@
-// One minimal file for every FormatId that recognition can reach, with the
-// name and companion files it needs, for the tests of recognition and of the
-// hosts that report it.
+// One minimal file for every FormatId that recognition can reach, with its name
+// and companions, for the tests of recognition and of the hosts that report it.
 #pragma once
 
 #include <string>
-#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -14,16 +12,21 @@ namespace cairn::test {
 
 struct DetectCase {
   FormatId id;
-  std::string fileName;
+  std::string fileName;                                   // empty: recognised without a path
   Bytes bytes;                                            // at least 104 bytes
   std::vector<std::pair<std::string, Bytes>> companions;  // files beside it
 };
 
-// Every id from 1 to 157 except 70, 91 and 130, which no header reaches, in
-// ascending order.
+// Every id from 1 to 157 except 91 and 130, which no file reaches, and 70,
+// whose "PACK" directories have rows of their own; in ascending order.
 std::vector<DetectCase> DetectCases();
 
-// Bytes written as hexadecimal pairs separated by spaces: "50 41 43 4B".
-Bytes FromHex(std::string_view hex);
+// The builder's bytes padded with zeros to `n`, a whole header by default.
+inline Bytes Header(ArchiveBuilder b, size_t n = kHeaderSize) {
+  return b.padTo(n).get();
+}
+
+// "AAAA" (a first word no rule takes) and zeros, with 32-bit words at offsets.
+Bytes Words(std::initializer_list<std::pair<size_t, uint32_t>> words, size_t size = kHeaderSize);
 
 }  // namespace cairn::test

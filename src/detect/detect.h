@@ -2,8 +2,9 @@
 // path and, for a few formats, a companion file beside it.
 //
 // Two stages: the magics of the signature table, compared at offset 0 in row
-// order (FormatIds 1 to 79), then the ordered structural and extension rules
-// (FormatIds 80 to 157). The first match decides.
+// order (FormatIds 1 to 79; a "PACK" file whose header describes a readable
+// directory is 70 rather than 7), then the ordered structural and extension
+// rules (FormatIds 80 to 157). The first match decides.
 #pragma once
 
 #include <cstdint>
@@ -23,12 +24,13 @@ FormatId DetectFormat(ByteView header, std::string_view path, os::Handle h);
 // One row of the signature table: row n stands for FormatId n.
 struct Signature {
   FormatId id;
-  std::string_view magic;  // compared whole, case included, at offset 0
+  std::string_view magic;  // compared whole, case included, at offset 0; row 70 has none
 };
 std::span<const Signature> SignatureTable();
 
-// The first stage alone: the FormatId of the first row whose magic begins
-// `header`, or 0.
+// The magics alone: the FormatId of the first row whose magic begins
+// `header`, or 0. A "PACK" file answers 7 here; DetectFormat then looks at
+// its directory.
 FormatId MatchSignature(ByteView header);
 
 // The second stage alone, for a header that no magic matched: `size` is the

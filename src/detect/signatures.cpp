@@ -1,12 +1,16 @@
 // The first stage of recognition: magics at offset 0.
 //
 // Row n of the table stands for FormatId n and the rows are tried in order,
-// so a magic that begins with an earlier row's magic is never reached: "PACK"
-// (row 7) takes every header that the longer "PACK" 00 00 of row 70 would.
+// so a magic that begins with an earlier row's magic is never reached. Row 70
+// has no magic of its own: "PACK" directory archives begin like the "PACK"
+// compressed files of row 7 and are told apart by the directory their header
+// describes (PackDirectory).
+#include <algorithm>
 #include <array>
 #include <cstddef>
 
 #include "detect/detect.h"
+#include "util/file.h"
 
 namespace cairn {
 namespace {
@@ -92,7 +96,7 @@ constexpr std::array<SignatureRow, 79> kSignatureRows = {{
     {4, "MIX1"sv},
     {4, "THU3"sv},
     {4, "SDPA"sv},
-    {6, "PACK\0\0"sv},
+    {0, {}},  // "PACK" directory archive, see PackDirectory
     {8, "TEX\0\x01\0\0\0"sv},
     {8, "TEX\0\x02\0\0\0"sv},
     {16, "xcr File 1.00\0\0\0"sv},
@@ -106,7 +110,8 @@ constexpr std::array<SignatureRow, 79> kSignatureRows = {{
 
 constexpr bool LengthsAgree() {
   for (const SignatureRow& r : kSignatureRows)
-    if (r.magic.size() != r.length || r.length < 3 || r.length > kHeaderSize) return false;
+    if (r.magic.size() != r.length || (r.length != 0 && (r.length < 3 || r.length > kHeaderSize)))
+      return false;
   return true;
 }
 static_assert(LengthsAgree(), "a magic differs from its stated length");
@@ -119,6 +124,33 @@ constexpr std::array<Signature, 79> MakeTable() {
 }
 constexpr std::array<Signature, 79> kSignatures = MakeTable();
 
+// A "PACK" file holds a directory of 64-byte records (name[56], offset,
+// size) rather than one compressed stream when its header describes one that
+// can be read: the offset at 4 lies behind the 12-byte header, the byte size
+// at 8 is a whole number of records, the directory lies inside the file, and
+// its first records (one read of at most two) hold a printable name that ends
+// inside its field and an entry that lies inside the file.
+bool PackDirectory(ByteView header, os::Handle h, uint32_t size) {
+  constexpr uint32_t kRecord = 64, kNameWidth = 56;
+  if (!header.has(0, 12)) return false;
+  const uint32_t at = header.u32le(4), length = header.u32le(8);
+  if (at < 12 || length == 0 || length % kRecord != 0 || uint64_t{at} + length > size) return false;
+  std::array<uint8_t, 2 * kRecord> first{};
+  const uint32_t n = std::min<uint32_t>(length, first.size());
+  if (!ReadAt(h, first.data(), at, n)) return false;
+  for (uint32_t r = 0; r < n; r += kRecord) {
+    const ByteView record(first.data() + r, kRecord);
+    const std::string_view name = record.field(0, kNameWidth);
+    const bool printable = std::all_of(name.begin(), name.end(), [](char c) {
+      return static_cast<uint8_t>(c) >= 0x20 && static_cast<uint8_t>(c) <= 0x7E;
+    });
+    if (name.empty() || name.size() == kNameWidth || !printable ||
+        uint64_t{record.u32le(kNameWidth)} + record.u32le(kNameWidth + 4) > size)
+      return false;
+  }
+  return true;
+}
+
 }  // namespace
 
 std::span<const Signature> SignatureTable() {
@@ -127,13 +159,15 @@ std::span<const Signature> SignatureTable() {
 
 FormatId MatchSignature(ByteView header) {
   for (const Signature& s : kSignatures)
-    if (header.matches(0, s.magic)) return s.id;
+    if (!s.magic.empty() && header.matches(0, s.magic)) return s.id;
   return 0;
 }
 
 FormatId DetectFormat(ByteView header, std::string_view path, os::Handle h) {
   const uint32_t size = os::SizeLow(h);
-  if (const FormatId id = MatchSignature(header)) return id;
+  const FormatId id = MatchSignature(header);
+  if (id == 7 && PackDirectory(header, h, size)) return 70;
+  if (id != 0) return id;
   return DetectByRules(header, path, h, size);
 }
 

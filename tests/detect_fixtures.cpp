@@ -23,6 +23,10 @@ std::vector<DetectCase> DetectCases() {
   std::vector<DetectCase> v;
   for (const Signature& s : SignatureTable())
     if (!s.magic.empty()) v.push_back({s.id, "a.res", Header(B().text(s.magic))});
+  // A "PACK" directory of one record, "a" at 12, 4 bytes long.
+  v.insert(v.begin() + 69,
+           {70, "a.pak",
+            Header(B().text("PACK").u32(16).u32(64).padTo(16).name("a", 56).u32(12).u32(4), 128)});
   const std::vector<DetectCase> rules = {
       {80, "a.res", Header(B().u32(0x20030507))},
       {81, "a.res", Header(B().u32(0xFFFFFFFF).u32(0).u32(0).u32(80))},

@@ -17,8 +17,8 @@ struct DetectCase {
   std::vector<std::pair<std::string, Bytes>> companions;  // files beside it
 };
 
-// Every id from 1 to 157 except 91 and 130, which no file reaches, and 70,
-// whose "PACK" directories have rows of their own; in ascending order.
+// Every id from 1 to 157 except 91 and 130, which no file reaches, in
+// ascending order.
 std::vector<DetectCase> DetectCases();
 
 // The builder's bytes padded with zeros to `n`, a whole header by default.

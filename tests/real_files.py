@@ -67,12 +67,12 @@ def check(archive, host, plugin, cairn, work):
     lumps = directory(data)
     out = os.path.join(work, os.path.basename(archive))
     listed = host_listing(host, plugin, archive, out)
-    stored = [e for e in listed if not e[0].startswith("_TO_")]
-    assert [(n, s, s) for n, _, s in lumps] == [e[:3] for e in stored], "plug-in listing"
+    stored = [i for i, e in enumerate(listed) if not e[0].startswith("_TO_")]
+    assert [(n, s, s) for n, _, s in lumps] == [listed[i][:3] for i in stored], "plug-in listing"
     assert [(n, u, p) for n, p, u, _ in listed] == tool_listing(cairn, archive), "cairn list"
     failed = [e[0] for e in listed if e[3] != 0]
     assert not failed, f"extraction failed: {failed[:5]}"
-    for i, (name, offset, size) in enumerate(lumps):
+    for i, (name, offset, size) in zip(stored, lumps):
         with open(os.path.join(out, "0", str(i)), "rb") as f:
             assert f.read() == data[offset:offset + size], f"bytes of {name}"
     pictures = [i for i, e in enumerate(listed) if e[0] == "_TO_TGA_\\gfx\\conback.lmp.tga"]

@@ -81,20 +81,14 @@ Bytes Glb(const std::vector<std::pair<std::string, Bytes>>& files) {
 
 // The lines between the two rules of a listing; `total` gets the line after.
 Strings ListedRows(const std::string& out, std::string* total = nullptr) {
-  Strings rows;
+  Strings lines;
   std::istringstream in(out);
-  int rules = 0;
-  for (std::string line; std::getline(in, line);) {
-    if (line.rfind("--------", 0) == 0) {
-      ++rules;
-    } else if (rules == 1) {
-      rows.push_back(line);
-    } else if (rules == 2 && total != nullptr) {
-      *total = line;
-      break;
-    }
-  }
-  return rows;
+  for (std::string line; std::getline(in, line);) lines.push_back(line);
+  const auto rule = [](const std::string& line) { return line.rfind("--------", 0) == 0; };
+  const auto first = std::find_if(lines.begin(), lines.end(), rule);
+  const auto second = std::find_if(first + 1, lines.end(), rule);
+  if (total != nullptr && second + 1 < lines.end()) *total = second[1];
+  return Strings(first + 1, second);
 }
 
 Files FilesBelow(const fs::path& root) {

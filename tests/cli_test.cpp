@@ -325,8 +325,7 @@ TEST(Cli, ReplaysEverySample) {
     if (!s.recognised) continue;
     SCOPED_TRACE(s.label);
     TempDir dir;
-    for (const auto& [name, bytes] : s.companions) dir.write(name, bytes);
-    const std::string path = dir.write(s.fileName, s.bytes);
+    const std::string path = WriteSample(s, dir);
     Strings names, listed;
     Files expected;
     for (size_t i = 0; i < s.data.size(); ++i) {

@@ -136,8 +136,7 @@ TEST(PluginHost, ListsAndExtractsEverySampleAsAFileManagerDoes) {
     if (!s.recognised) continue;
     SCOPED_TRACE(s.label);
     TempDir dir;
-    for (const auto& [name, bytes] : s.companions) dir.write(name, bytes);
-    const std::string path = dir.write(s.fileName, s.bytes);
+    const std::string path = WriteSample(s, dir);
     g_reports.clear();
     const Walk w = HostWalk(path, dir);
     ASSERT_EQ(w.openResult, 0);

@@ -31,6 +31,11 @@ SampleTable AllSamples() {
   return all;
 }
 
+std::string WriteSample(const Sample& s, const TempDir& dir) {
+  for (const auto& [name, bytes] : s.companions) dir.write(name, bytes);
+  return dir.write(s.fileName, s.bytes);
+}
+
 Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries) {
   for (const auto& [name, offset, data] : entries) {
     s.listing.push_back({name, offset, uint32_t(data.size()), uint32_t(data.size()), 0, 0});
@@ -60,8 +65,7 @@ TEST(Samples, EachListsAndExtractsExactly) {
   for (const Sample& s : AllSamples()) {
     SCOPED_TRACE(s.label);
     auto direct = std::make_unique<Opened>();
-    for (const auto& [name, bytes] : s.companions) direct->dir.write(name, bytes);
-    const std::string path = direct->dir.write(s.fileName, s.bytes);
+    const std::string path = WriteSample(s, direct->dir);
     ASSERT_EQ(OpenArchiveAs(direct->session, path, s.id), kOk);
     ExpectListsAndExtracts(s, *direct);
     if (!s.recognised) continue;

@@ -33,6 +33,9 @@ std::vector<SampleMaker>& SampleMakers();
 // Every registered sample, in registration order.
 SampleTable AllSamples();
 
+// Writes the archive and its companions into `dir`; answers the archive's path.
+std::string WriteSample(const Sample& s, const TempDir& dir);
+
 // The row `s` with entries that are all stored as they are, each given as
 // (listed name, offset, bytes).
 Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries);

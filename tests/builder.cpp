@@ -4,6 +4,8 @@
 #include <zlib.h>
 
 #include <atomic>
+#include <fstream>
+#include <iterator>
 #include <ostream>
 #include <random>
 
@@ -23,11 +25,14 @@ TempDir::~TempDir() {
 }
 
 std::string TempDir::write(std::string_view name, const Bytes& b) const {
-  const std::string p = path(name);
-  std::filesystem::create_directories(std::filesystem::path(p).parent_path());
-  std::ofstream f(p, std::ios::binary | std::ios::trunc);
-  f.write(reinterpret_cast<const char*>(b.data()), static_cast<std::streamsize>(b.size()));
-  return p;
+  return WriteFile(dir_ / std::string(name), b);
+}
+
+std::string WriteFile(const std::filesystem::path& path, const Bytes& b) {
+  std::filesystem::create_directories(path.parent_path());
+  std::ofstream(path, std::ios::binary | std::ios::trunc)
+      .write(reinterpret_cast<const char*>(b.data()), static_cast<std::streamsize>(b.size()));
+  return path.string();
 }
 
 Bytes Compress(const Bytes& data, int level) {
@@ -87,13 +92,6 @@ Bytes Opened::extract(size_t index) {
   Bytes out;
   EXPECT_EQ(extract(index, out), kOk) << "entry " << index;
   return out;
-}
-
-std::unique_ptr<Opened> OpenBytes(const Bytes& bytes, std::string_view fileName) {
-  auto o = std::make_unique<Opened>();
-  const std::string p = o->dir.write(fileName, bytes);
-  o->result = OpenArchiveSession(o->session, p);
-  return o;
 }
 
 std::unique_ptr<Opened> OpenBytesAs(FormatId format, const Bytes& bytes,

@@ -2,10 +2,10 @@
 // temporary folder, opened and extracted through the core.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
+#include <initializer_list>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -22,37 +22,23 @@ using Bytes = std::vector<uint8_t>;
 
 class ArchiveBuilder {
  public:
-  ArchiveBuilder& u8(uint8_t v) {
-    b_.push_back(v);
-    return *this;
-  }
-  ArchiveBuilder& u16(uint16_t v) { return u8(v & 0xFF).u8(v >> 8); }
-  ArchiveBuilder& u16be(uint16_t v) { return u8(v >> 8).u8(v & 0xFF); }
-  ArchiveBuilder& u32(uint32_t v) { return u16(v & 0xFFFF).u16(v >> 16); }
-  ArchiveBuilder& u32be(uint32_t v) { return u16be(v >> 16).u16be(v & 0xFFFF); }
-  // The text's bytes, no terminator.
-  ArchiveBuilder& text(std::string_view s) {
-    b_.insert(b_.end(), s.begin(), s.end());
-    return *this;
-  }
-  // A fixed-width name field, zero-padded (cut when the text is longer).
-  ArchiveBuilder& name(std::string_view s, size_t width) {
-    for (size_t i = 0; i < width; ++i) u8(i < s.size() ? static_cast<uint8_t>(s[i]) : 0);
-    return *this;
-  }
   ArchiveBuilder& bytes(const Bytes& v) {
     b_.insert(b_.end(), v.begin(), v.end());
     return *this;
   }
-  ArchiveBuilder& fill(size_t n, uint8_t v = 0) {
-    b_.insert(b_.end(), n, v);
-    return *this;
+  ArchiveBuilder& u8(uint8_t v) { return bytes({v}); }
+  ArchiveBuilder& u16(uint16_t v) { return u8(v & 0xFF).u8(v >> 8); }
+  ArchiveBuilder& u16be(uint16_t v) { return u8(v >> 8).u8(v & 0xFF); }
+  ArchiveBuilder& u32(uint32_t v) { return u16(v & 0xFFFF).u16(v >> 16); }
+  ArchiveBuilder& u32be(uint32_t v) { return u16be(v >> 16).u16be(v & 0xFFFF); }
+  ArchiveBuilder& text(std::string_view s) { return bytes(Bytes(s.begin(), s.end())); }
+  ArchiveBuilder& fill(size_t n, uint8_t v = 0) { return bytes(Bytes(n, v)); }
+  // A fixed-width name field, zero-padded (cut when the text is longer).
+  ArchiveBuilder& name(std::string_view s, size_t width) {
+    return text(s.substr(0, width)).fill(width - std::min(width, s.size()));
   }
   // Zero bytes up to position `n`.
-  ArchiveBuilder& padTo(size_t n) {
-    if (b_.size() < n) b_.resize(n, 0);
-    return *this;
-  }
+  ArchiveBuilder& padTo(size_t n) { return fill(n - std::min(n, size())); }
   // Overwrites a u32 written earlier (a placeholder for an offset).
   ArchiveBuilder& patch32(size_t at, uint32_t v) {
     for (int i = 0; i < 4; ++i) b_.at(at + i) = static_cast<uint8_t>(v >> (8 * i));
@@ -76,9 +62,10 @@ inline Bytes Text(std::string_view s) {
   return Bytes(s.begin(), s.end());
 }
 
-inline Bytes Join(Bytes a, const Bytes& b) {
-  a.insert(a.end(), b.begin(), b.end());
-  return a;
+inline Bytes Cat(std::initializer_list<Bytes> parts) {
+  Bytes b;
+  for (const Bytes& p : parts) b.insert(b.end(), p.begin(), p.end());
+  return b;
 }
 
 // A complete zlib stream of `data`.
@@ -108,6 +95,8 @@ class TempDir {
   std::filesystem::path dir_;
 };
 
+// Writes `b` to `path`, making the folders on the way.
+std::string WriteFile(const std::filesystem::path& path, const Bytes& b);
 Bytes ReadFile(const std::string& path);
 bool Exists(const std::string& path);
 
@@ -131,9 +120,8 @@ struct Opened {
   Bytes extract(size_t index);  // expects success
 };
 
-// Writes `bytes` under `fileName` in a fresh folder and opens it.
-std::unique_ptr<Opened> OpenBytes(const Bytes& bytes, std::string_view fileName = "test.bin");
-// The same, read as FormatId `format` without recognition.
+// Writes `bytes` under `fileName` in a fresh folder and opens it as FormatId
+// `format`, without recognition.
 std::unique_ptr<Opened> OpenBytesAs(FormatId format, const Bytes& bytes,
                                     std::string_view fileName = "test.bin");
 

@@ -31,12 +31,6 @@ void ExpectStreams(const std::vector<Stream>& streams) {
   }
 }
 
-Bytes Cat(std::initializer_list<Bytes> parts) {
-  Bytes b;
-  for (const Bytes& p : parts) b.insert(b.end(), p.begin(), p.end());
-  return b;
-}
-
 // `b`, then `length` bytes copied one at a time from `distance` back.
 Bytes Back(Bytes b, size_t distance, size_t length) {
   for (size_t k = 0; k < length; ++k) b.push_back(b[b.size() - distance]);
@@ -146,7 +140,7 @@ TEST(OpcodeLz, CopiesRepeatTheBytesJustWritten) {
 
 TEST(Methods, EachEntryExtractsExactlyOrIsBadData) {
   const Bytes many = Pattern(150000, 4), zStored = Compress(many, 0), zData = Compress(Pattern(9));
-  const Bytes picture = Pattern(200000, 3), prefixed = Join({0xE8, 3, 0, 0}, picture);
+  const Bytes picture = Pattern(200000, 3), prefixed = Cat({{0xE8, 3, 0, 0}, picture});
   const Bytes zFewer = Compress(prefixed);
   const Bytes zFits = Compress(Bytes(4194304, 7)), zOver = Compress(Bytes(4194305, 7));
   // A block: its length L (data bytes + 1), three bytes nobody reads, the data.

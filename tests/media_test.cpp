@@ -20,11 +20,6 @@ Bytes Le(std::initializer_list<uint32_t> words, unsigned width = 4) {
     for (unsigned i = 0; i < width; ++i) b.push_back(static_cast<uint8_t>(w >> (8 * i)));
   return b;
 }
-Bytes Cat(std::initializer_list<Bytes> parts) {
-  Bytes b;
-  for (const Bytes& p : parts) b.insert(b.end(), p.begin(), p.end());
-  return b;
-}
 // Bytes 0 and 2 of every `step` bytes exchanged: red-green-blue to blue-green-red.
 Bytes Swap02(Bytes b, size_t step) {
   for (size_t i = 0; i + step <= b.size(); i += step) std::swap(b[i], b[i + 2]);
@@ -33,13 +28,13 @@ Bytes Swap02(Bytes b, size_t step) {
 // The `size`-byte palette entries that `indices` select.
 Bytes Pick(const Bytes& indices, const Bytes& palette, size_t size) {
   Bytes out;
-  for (uint8_t i : indices) out = Join(out, Slice(palette, i * size, size));
+  for (uint8_t i : indices) out = Cat({out, Slice(palette, i * size, size)});
   return out;
 }
 // Every triple followed by `fourth`: RGBA as decoders read it, or BMP palette entries.
 Bytes Quads(const Bytes& rgb, uint8_t fourth = 255) {
   Bytes out;
-  for (size_t i = 0; i + 3 <= rgb.size(); i += 3) out = Join(out, Join(Slice(rgb, i, 3), {fourth}));
+  for (size_t i = 0; i + 3 <= rgb.size(); i += 3) out = Cat({out, Slice(rgb, i, 3), {fourth}});
   return out;
 }
 
@@ -247,7 +242,7 @@ TEST(MediaPalettes, AreTheDataFilesTheyComeFrom) {
     for (std::string line; std::getline(in, line);) {
       unsigned r, g, b;
       if (std::sscanf(line.c_str(), "%x %x %x", &r, &g, &b) == 3)
-        colours = Join(colours, {uint8_t(b), uint8_t(g), uint8_t(r), 0});
+        colours = Cat({colours, {uint8_t(b), uint8_t(g), uint8_t(r), 0}});
     }
     EXPECT_EQ(colours, Bytes(p->begin(), p->end())) << "palette " << n;
   }

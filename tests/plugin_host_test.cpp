@@ -16,36 +16,29 @@
 namespace cairn::test {
 namespace {
 
+// The plug-in's exports, looked up by name as a host does.
 struct Plugin {
-  decltype(&::OpenArchive) OpenArchive;
-  decltype(&::ReadHeader) ReadHeader;
-  decltype(&::ProcessFile) ProcessFile;
-  decltype(&::CloseArchive) CloseArchive;
-  decltype(&::SetChangeVolProc) SetChangeVolProc;
-  decltype(&::SetProcessDataProc) SetProcessDataProc;
-  decltype(&::CanYouHandleThisFile) CanYouHandleThisFile;
-  decltype(&::GetPackerCaps) GetPackerCaps;
+  void* lib = dlopen(CAIRN_PLUGIN_PATH, RTLD_NOW | RTLD_LOCAL);
+  template <typename F>
+  F find(const char* name) {
+    void* f = lib != nullptr ? dlsym(lib, name) : nullptr;
+    if (f == nullptr) throw std::runtime_error(lib != nullptr ? name : dlerror());
+    return reinterpret_cast<F>(f);
+  }
+#define CAIRN_EXPORT(name) decltype(&::name) name = find<decltype(&::name)>(#name)
+  CAIRN_EXPORT(OpenArchive);
+  CAIRN_EXPORT(ReadHeader);
+  CAIRN_EXPORT(ProcessFile);
+  CAIRN_EXPORT(CloseArchive);
+  CAIRN_EXPORT(SetChangeVolProc);
+  CAIRN_EXPORT(SetProcessDataProc);
+  CAIRN_EXPORT(CanYouHandleThisFile);
+  CAIRN_EXPORT(GetPackerCaps);
+#undef CAIRN_EXPORT
 };
 
 const Plugin& Loaded() {
-  static const Plugin p = [] {
-    void* lib = dlopen(CAIRN_PLUGIN_PATH, RTLD_NOW | RTLD_LOCAL);
-    if (lib == nullptr) throw std::runtime_error(dlerror());
-    const auto find = [lib](const char* name, auto& f) {
-      f = reinterpret_cast<std::remove_reference_t<decltype(f)>>(dlsym(lib, name));
-      if (f == nullptr) throw std::runtime_error(name);
-    };
-    Plugin q;
-    find("OpenArchive", q.OpenArchive);
-    find("ReadHeader", q.ReadHeader);
-    find("ProcessFile", q.ProcessFile);
-    find("CloseArchive", q.CloseArchive);
-    find("SetChangeVolProc", q.SetChangeVolProc);
-    find("SetProcessDataProc", q.SetProcessDataProc);
-    find("CanYouHandleThisFile", q.CanYouHandleThisFile);
-    find("GetPackerCaps", q.GetPackerCaps);
-    return q;
-  }();
+  static const Plugin p;
   return p;
 }
 
@@ -136,7 +129,7 @@ TEST(PluginHost, ListsAndExtractsEverySampleAsAFileManagerDoes) {
     if (!s.recognised) continue;
     SCOPED_TRACE(s.label);
     TempDir dir;
-    const std::string path = WriteSample(s, dir);
+    const std::string path = WriteSample(s, dir.dir());
     g_reports.clear();
     const Walk w = HostWalk(path, dir);
     ASSERT_EQ(w.openResult, 0);

@@ -31,9 +31,9 @@ SampleTable AllSamples() {
   return all;
 }
 
-std::string WriteSample(const Sample& s, const TempDir& dir) {
-  for (const auto& [name, bytes] : s.companions) dir.write(name, bytes);
-  return dir.write(s.fileName, s.bytes);
+std::string WriteSample(const Sample& s, const std::filesystem::path& dir) {
+  for (const auto& [name, bytes] : s.companions) WriteFile(dir / name, bytes);
+  return WriteFile(dir / s.fileName, s.bytes);
 }
 
 Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries) {
@@ -65,7 +65,7 @@ TEST(Samples, EachListsAndExtractsExactly) {
   for (const Sample& s : AllSamples()) {
     SCOPED_TRACE(s.label);
     auto direct = std::make_unique<Opened>();
-    const std::string path = WriteSample(s, direct->dir);
+    const std::string path = WriteSample(s, direct->dir.dir());
     ASSERT_EQ(OpenArchiveAs(direct->session, path, s.id), kOk);
     ExpectListsAndExtracts(s, *direct);
     if (!s.recognised) continue;
@@ -83,21 +83,14 @@ TEST(Samples, EachListsAndExtractsExactly) {
 TEST(Samples, DumpWhenAsked) {
   const char* root = std::getenv("CAIRN_DUMP_FIXTURES");
   if (root == nullptr) GTEST_SKIP() << "CAIRN_DUMP_FIXTURES is not set";
-  std::filesystem::create_directories(root);
-  std::ofstream list(std::filesystem::path(root) / "list.txt");
-  const auto write = [](const std::filesystem::path& p, const Bytes& b) {
-    std::ofstream(p, std::ios::binary)
-        .write(reinterpret_cast<const char*>(b.data()), static_cast<std::streamsize>(b.size()));
-  };
+  std::string list;
   int n = 0;
-  for (const Sample& s : AllSamples()) {
-    if (!s.recognised) continue;
-    const auto dir = std::filesystem::path(root) / std::to_string(n);
-    std::filesystem::create_directories(dir);
-    for (const auto& [name, bytes] : s.companions) write(dir / name, bytes);
-    write(dir / s.fileName, s.bytes);
-    list << n++ << ' ' << s.fileName << '\n';
-  }
+  for (const Sample& s : AllSamples())
+    if (s.recognised) {
+      WriteSample(s, std::filesystem::path(root) / std::to_string(n));
+      list += std::to_string(n++) + ' ' + s.fileName + '\n';
+    }
+  WriteFile(std::filesystem::path(root) / "list.txt", Text(list));
 }
 
 }  // namespace cairn::test

@@ -34,7 +34,7 @@ std::vector<SampleMaker>& SampleMakers();
 SampleTable AllSamples();
 
 // Writes the archive and its companions into `dir`; answers the archive's path.
-std::string WriteSample(const Sample& s, const TempDir& dir);
+std::string WriteSample(const Sample& s, const std::filesystem::path& dir);
 
 // The row `s` with entries that are all stored as they are, each given as
 // (listed name, offset, bytes).

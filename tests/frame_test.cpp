@@ -44,12 +44,7 @@ TEST(RawCopy, CopiesInChunksReportsEachAndEndsInOneOfThreeWays) {
   };
   const Case cases[] = {
       {"empty", Pattern(200), Entry(50, 0), SIZE_MAX, kOk, {}, {0}},
-      {"three chunks",
-       big,
-       Entry(100, 3000000),
-       SIZE_MAX,
-       kOk,
-       test::Slice(big, 100, 3000000),
+      {"three chunks", big, Entry(100, 3000000), SIZE_MAX, kOk, test::Slice(big, 100, 3000000),
        {1048576, 1048576, 902848, 3000000}},
       {"past the end", Pattern(200), Entry(150, 51), SIZE_MAX, kBadData, {}, {}},
       {"offset wraps", Pattern(200), Entry(0xFFFFFFF0u, 4), SIZE_MAX, kBadData, {}, {}},
@@ -88,23 +83,6 @@ TEST(RawCopy, TheOutputCarriesTheArchiveTimesAndOverwritesAnExistingFile) {
   EXPECT_EQ(ExtractEntry(o->session, 0, o->dir.dir().string()), kCreateFailed);
   EXPECT_EQ(ExtractEntry(o->session, 7, o->dir.path("x")), kBadData);
   EXPECT_FALSE(test::Exists(o->dir.path("x")));
-}
-
-Bytes Xor(Bytes b, uint8_t key) {
-  for (uint8_t& c : b) c ^= key;
-  return b;
-}
-
-TEST(RawCopy, XorTransformsFollowTheFormatAndTheFlag) {
-  const Bytes data = Pattern(64);
-  const Bytes part = test::Slice(data, 8, 40);
-  EXPECT_EQ(SessionOver(26, data, {Entry(8, 40, 0x5A)})->extract(0), Xor(part, 0x5A));
-  EXPECT_EQ(SessionOver(26, data, {Entry(8, 40, 0)})->extract(0), part);
-  EXPECT_EQ(SessionOver(58, data, {Entry(8, 40, 0x11)})->extract(0), Xor(part, 0x11));
-  EXPECT_EQ(SessionOver(101, data, {Entry(8, 40, 0x6B)})->extract(0), Xor(part, 0x6B));
-  // Other formats copy unchanged whatever the Flag.
-  EXPECT_EQ(SessionOver(3, data, {Entry(8, 40, 0x6B)})->extract(0), part);
-  EXPECT_EQ(SessionOver(15, data, {Entry(8, 40, 0x6B)})->extract(0), part);
 }
 
 // Enciphers as the sound banks store their data: each little-endian word at
@@ -153,13 +131,6 @@ TEST(CompositeTrack, JoinsThreeEntriesChosenByTheFlag) {
   EXPECT_EQ(o->extract(183), (Bytes{137, 0, 0, 0, 136, 0, 0, 0, 138, 0, 0, 0}));
   Bytes out;
   EXPECT_EQ(o->extract(184, out), kBadData);  // table value 0: part -1 is outside
-}
-
-TEST(CompositeTrack, FlagsBeyondTheTableOrPartsOutsideTheTableFail) {
-  auto small = SessionOver(65, Pattern(100), {Entry(0, 4, 2), Entry(0, 4, 162)});
-  Bytes out;
-  EXPECT_EQ(small->extract(0, out), kBadData);  // T = 61 but only two entries
-  EXPECT_EQ(small->extract(1, out), kBadData);
 }
 
 }  // namespace

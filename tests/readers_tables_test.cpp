@@ -41,12 +41,6 @@ Sample Table(std::string label, FormatId id, std::string fileName, B head,
   return s;
 }
 
-Sample Row(std::string label, FormatId id, std::string fileName, Bytes bytes,
-           std::vector<Listed> listing, std::vector<Bytes> data, bool recognised = true) {
-  return {std::move(label), id, std::move(fileName), std::move(bytes), std::move(listing),
-          std::move(data),  {}, recognised};
-}
-
 // "IWAD", "PWAD": offset, size, name[8]; a marker lump has no data, the last
 // name fills its field.
 const std::vector<At> kLumps = {
@@ -78,14 +72,14 @@ Sample Wad2() {
   WadRecord(w, 12, 16, "PICTURE");
   WadRecord(w, 28, 8, "0123456789abcdef");  // fills the field
   WadRecord(w, 128, 4, "tail");
-  return Row("WAD2", 4, "gfx.wad", w.get(),
+  return Sample{"WAD2", 4, "gfx.wad", w.get(),
              {{"PICTURE", 12, 16, 16, 0, 0},
               {"_TO_TGA_\\PICTURE.tga", 12, 4 * 2 * 3 + 18, 16, 4 | 2 << 16, 1},
               {"0123456789abcdef", 28, 8, 8, 0, 0},
               {"_TO_TGA_\\0123456789abcdef.tga", 28, 18, 8, 0, 1},
               {"tail", 128, 4, 4, 0, 0}},
              {picture, GreyTga(4, 2, 0x21, {0x00, 0x0F, 0x1F, 0x2F, 0xEB, 0xDB, 0xCB, 0xBB}),
-              Bytes(8), GreyTga(0, 0, 0x21, {}), Bytes(4)});
+              Bytes(8), GreyTga(0, 0, 0x21, {}), Bytes(4)}};
 }
 
 // "WAD3": a mip texture (pixels at 40) and a plain picture (pixels at 8),
@@ -103,12 +97,12 @@ Sample Wad3() {
   WadRecord(w, 12, 816, "brick");
   WadRecord(w, 828, 784, "conchars");
   const Bytes tga = GreyTga(2, 2, 0x20, {250, 249, 248, 55});
-  return Row("WAD3", 5, "halflife.wad", w.get(),
+  return Sample{"WAD3", 5, "halflife.wad", w.get(),
              {{"brick", 12, 816, 816, 0, 0},
               {"_TO_TGA_\\brick.tga", 12, 2 * 2 * 3 + 18, 816, 2 | 2 << 16, 1},
               {"conchars", 828, 784, 784, 0, 0},
               {"_TO_TGA_\\conchars.tga", 828, 2 * 2 * 3 + 18, 784, 2 | 2 << 16, 2}},
-             {mip.get(), tga, plain.get(), tga});
+             {mip.get(), tga, plain.get(), tga}};
 }
 
 // The "PACK" directory archive: a picture with its size at 0 and 4, one
@@ -121,14 +115,15 @@ Sample Pack() {
   const std::string full(56, 'p');
   w.text("PACK").u32(134).u32(2 * 64 + 40).bytes(first).bytes(second.get());
   w.name("gfx/first.lmp", 56).u32(12).u32(14).name(full, 56).u32(26).u32(108).fill(40, 0x13);
-  return Row("PACK directory", 70, "pak0.pak", w.get(),
+  return Sample{"PACK directory", 70, "pak0.pak", w.get(),
              {{"gfx\\first.lmp", 12, 14, 14, 0, 0},
               {"_TO_TGA_\\gfx\\first.lmp.tga", 12, 3 * 2 * 3 + 18, 14, 3 | 2 << 16, 1},
               {full, 26, 108, 108, 0, 0},
               {"_TO_TGA_\\" + full + ".tga", 26, 2 * 4 * 3 + 18, 108, 2 | 4 << 16, 2}},
              {first, GreyTga(3, 2, 0x21, {0x0F, 0x1F, 0x2F, 0x3F, 0x4B, 0x5B}), second.get(),
               GreyTga(2, 4, 0x21, {0x8B, 0x7B, 0x6B, 0x5B, 0x4B, 0x3F, 0x2F, 0x1F})},
-             false);
+             {},
+             false};
 }
 
 const std::string kName38 = std::string(34, 'y') + ".txt", kName80 = std::string(76, 'x') + ".dat";
@@ -197,10 +192,10 @@ CAIRN_SAMPLES(TableSamples) {
              {"MUD.BMP", 120, 5},
              {"SAND.BMP", 125, 15}},
             [](B& b, auto& n, auto& e) { b.name(n, 14).u32(e.size).u32(e.offset - 2); }),
-      Row("LOD, zlib entries", 10, "h3bitmap.lod", lod.get(),
+      Sample{"LOD, zlib entries", 10, "h3bitmap.lod", lod.get(),
           {{"intro.txt", 156, 63, introSize, 0, 0},
            {"map.dat", 156 + introSize, 300, mapSize, 0, 0}},
-          {intro, map}),
+          {intro, map}},
       Table("CSid", 11, "sprites.csd", B().text("CSid").u16(3),
             {{"SPRITE.SHP", 69, 20}, {"PALETTE.PAL", 89, 10}, {"ICONS.ICN", 99, 15}},
             [](B& b, auto& n, auto& e) { b.u8(0x99).name(n, 12).u32(e.size).u32(e.offset); }),

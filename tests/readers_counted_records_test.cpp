@@ -45,9 +45,10 @@ CAIRN_SAMPLES(CountedRecordSamples) {
   // The first record's offset ends the directory.
   lp.text("LP1C").u32(0).u32(2).u8(9).text("intro.smk").u32(5).u32(62).fill(8);
   lp.u8(7).text("x/y.txt").u32(70).u32(67).fill(8).bytes(a).bytes(b);
-  Sample ezdRow{"ezd", 64, "data.ezd", ezd.get(),
-                {{"a.txt", 60, 5, azSize, 0, 0}, {"x\\b", 60 + azSize, 70, bzSize, 0, 0}},
-                {a, b}};
+  Sample ezdRow =
+      Row({"ezd", 64, "data.ezd", ezd.get()}, {{"a.txt", 60, a}, {"x\\b", 60 + azSize, b}});
+  ezdRow.listing[0].packed = azSize;
+  ezdRow.listing[1].packed = bzSize;
   return {
       Row({"AWAD", 59, "game.awd", awad.get()}, {{"title.pcx", 64, a}, {full, 69, b}}),
       Row({"MJZ0", 60, "game.mjz", mjz.get()}, {{"a.txt", 448, a}, {"c.dat", 453, c}}),

@@ -178,7 +178,7 @@ void ReadLp1c(ReaderContext& c) {
 
 // Rows in the order of the registry's `row` column.
 constexpr std::array<void (*)(ReaderContext&), 10> kCountedRecordReaders = {
-    ReadAwad, ReadMjz0, ReadMh3, ReadVer2, ReadMqdb,
+    ReadAwad, ReadMjz0, ReadMh3,  ReadVer2, ReadMqdb,
     ReadEzd,  ReadMix1, ReadThu3, ReadSdpa, ReadLp1c,
 };
 

@@ -1,6 +1,4 @@
-// Samples and refusals of the further counted record directories: "AWAD"
-// (59), "MJZ0" (60), "MH3 V1.0 " (61), "VER2" (62), "MQDB" (63), "ezd" (64),
-// "MIX1" (67), "THU3" (68), "SDPA" (69) and "LP1C" (74).
+// Samples and refusals of the counted record directories, FormatIds 59 to 74.
 #include <gtest/gtest.h>
 
 #include "samples.h"
@@ -38,31 +36,26 @@ CAIRN_SAMPLES(CountedRecordSamples) {
   // Names 4 past the word at 8, each ending at its length or its first zero.
   mix.text("MIX1").u32(16).u32(44).padTo(16).u32(2).u32(0).u32(61).u32(5).u32(0).u32(66).u32(70);
   mix.u32(0).u8(5).text("a.txt").u8(6).text("b.d").fill(3, 0).bytes(a).bytes(b);
-  thu.text("THU3").u32(3).u32(108).padTo(16).u32(0).u32(111).fill(16).u32(3).text("one");
-  thu.u32(0).u32(116).fill(16).u32(7).text("two.wav").u32(0).u32(116).fill(16).u32(1).text("x");
-  thu.bytes(a).bytes(b);
+  thu.text("THU3").u32(3).u32(108).padTo(16).u32(0).u32(111).fill(16).u32(3).text("one").u32(0);
+  thu.u32(116).fill(16).u32(7).text("two.wav").u32(0).u32(116).fill(16).u32(1).text("x").bytes(a);
+  thu.bytes(b);
   sdpa.text("SDPA").u32(2).u32(32).u32(5).u32(0).u32(37).u32(70).u32(0).bytes(a).bytes(b);
-  // The first record's offset ends the directory.
   lp.text("LP1C").u32(0).u32(2).u8(9).text("intro.smk").u32(5).u32(62).fill(8);
   lp.u8(7).text("x/y.txt").u32(70).u32(67).fill(8).bytes(a).bytes(b);
-  Sample ezdRow =
-      Row({"ezd", 64, "data.ezd", ezd.get()}, {{"a.txt", 60, a}, {"x\\b", 60 + azSize, b}});
-  ezdRow.listing[0].packed = azSize;
-  ezdRow.listing[1].packed = bzSize;
+  Sample z = Row({"ezd", 64, "data.ezd", ezd.get()}, {{"a.txt", 60, a}, {"x\\b", 60 + azSize, b}});
+  z.listing[0].packed = azSize;
+  z.listing[1].packed = bzSize;
   return {
       Row({"AWAD", 59, "game.awd", awad.get()}, {{"title.pcx", 64, a}, {full, 69, b}}),
       Row({"MJZ0", 60, "game.mjz", mjz.get()}, {{"a.txt", 448, a}, {"c.dat", 453, c}}),
       Row({"MH3 V1.0", 61, "game.mh3", mh3.get()}, {{"one", 320, a}, {"two", 325, c}}),
       Row({"VER2", 62, "game.ver", ver.get()}, {{name24, 2048, sector}, {"empty", 4096, {}}}),
-      Row({"MQDB", 63, "music.mqdb", mqdb.get()}, {{"music.mqdb.000000.wav", 80, riff},
-                                                   {"music.mqdb.000001.png", 89, png},
-                                                   {"music.mqdb.000002", 103, a}}),
-      ezdRow,
+      Row({"MQDB", 63, "m.db", mqdb.get()},
+          {{"m.db.000000.wav", 80, riff}, {"m.db.000001.png", 89, png}, {"m.db.000002", 103, a}}),
+      z,
       Row({"MIX1", 67, "game.mix", mix.get()}, {{"a.txt", 61, a}, {"b.d", 66, b}}),
-      Row({"THU3", 68, "game.thu", thu.get()},
-          {{"one", 111, a}, {"two.wav", 116, {}}, {"x", 116, b}}),
-      Row({"SDPA", 69, "voice.sdp", sdpa.get()},
-          {{"voice.sdp.000000.wav", 32, a}, {"voice.sdp.000001.wav", 37, b}}),
+      Row({"THU3", 68, "a.thu", thu.get()}, {{"one", 111, a}, {"two.wav", 116, {}}, {"x", 116, b}}),
+      Row({"SDPA", 69, "v", sdpa.get()}, {{"v.000000.wav", 32, a}, {"v.000001.wav", 37, b}}),
       Row({"LP1C", 74, "game.lp", lp.get()}, {{"intro.smk", 62, a}, {"x\\y.txt", 67, b}}),
   };
 }
@@ -72,8 +65,6 @@ TEST(CountedRecords, RefusesBrokenDirectories) {
   const auto with = [&](size_t row, size_t at, uint32_t v) {
     return B().bytes(rows[row].bytes).patch32(at, v).get();
   };
-  Bytes negative = rows[9].bytes;
-  negative[12] = 0x80;
   ExpectRefused({
       {"MH3 region ending before 64", 61, with(2, 48, 63)},
       {"VER2 sector beyond 4 GiB", 62, with(3, 8, 0x200000)},
@@ -81,7 +72,7 @@ TEST(CountedRecords, RefusesBrokenDirectories) {
       {"MIX1 names before the records", 67, with(6, 8, 12)},
       {"THU3 name of 260", 68, with(7, 40, 260)},
       {"THU3 offsets going back", 68, with(7, 51, 117)},
-      {"LP1C negative name length", 74, negative},
+      {"LP1C negative name length", 74, with(9, 12, 0x746E6980)},  // 0x80, then "int"
   });
 }
 

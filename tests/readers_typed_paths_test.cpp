@@ -1,6 +1,4 @@
-// Samples and refusals of the directories with type codes and stored paths:
-// "GABA" (41), "H4R" (44), the newline directory (48), "BIG" (52) and the
-// resource file of signature row 57.
+// Samples and refusals of the typed and path-carrying directories, FormatIds 41 to 57.
 #include <gtest/gtest.h>
 
 #include "samples.h"
@@ -18,16 +16,14 @@ Sample Listing(Sample s, std::vector<Listed> listing, std::vector<Bytes> data) {
 
 CAIRN_SAMPLES(TypedPathSamples) {
   const Bytes a = Pattern(5, 1), b = Pattern(70, 2), c = Pattern(10, 3);
-  B gaba, h4r, lines, big, res;
+  B gaba, wav, h4r, lines, big, res;
   // Type 0x24 is MP3; type 6 is PCM, extracted behind a WAV header.
   gaba.text("GABA").u32(4).u32(3).u32(0).name("music", 32).u32(208).u32(5).u32(44100).u32(0x24);
   gaba.fill(16).name("shot", 32).u32(213).u32(70).u32(22050).u32(6).fill(16);
   gaba.name("voice.raw", 32).u32(283).u32(10).u32(8000).u32(9).fill(16).bytes(a).bytes(b).bytes(c);
-  B wav;
   wav.text("RIFF").u32(102).text("WAVEfmt ").u32(16).u32(0x10001).u32(22050).u32(44100).u16(2);
   wav.u16(16).text("data").bytes(b);
-  // A path of "C:\" keeps the letter; storage code 3 is gzip. Each record is
-  // read as 260 bytes.
+  // "C:\" keeps the letter; code 3 is gzip; each record is read as 260 bytes.
   h4r.text("H4R\x05").u32(8).u32(3).u32(125).u32(5).fill(8).u16(9).text("intro.smk").u16(0);
   h4r.u16(1).u16(0).u32(130).u32(10).fill(8).u16(8).text("kick.wav").u16(7).text("C:\\snd\\");
   h4r.u16(0).u16(3).u16(0).u32(140).u32(70).fill(8).u16(5).text("a.map").u16(10);
@@ -60,25 +56,20 @@ CAIRN_SAMPLES(TypedPathSamples) {
   };
 }
 
-// A path whose second character is '\' loses its first, leaving a name that
-// begins with '\' (which the command-line tool will not write).
-TEST(TypedPaths, H4rPathLosesItsFirstCharacterBeforeABackslash) {
+// An H4R path whose second character is '\' loses its first.
+TEST(TypedPaths, KeepsTheH4rPathQuirkAndRefusesBrokenDirectories) {
   B h4r;
   h4r.text("H4R\x05").u32(8).u32(1).u32(0).u32(0).fill(8).u16(1).text("f").u16(2).text(".\\");
   auto o = OpenBytesAs(44, h4r.u16(1).u16(0).padTo(272).get());
   EXPECT_EQ(o->listing(), (std::vector<Listed>{{"\\f", 0, 0, 0, 0, 0}}));
-}
-
-TEST(TypedPaths, RefusesBrokenDirectories) {
   const SampleTable rows = TypedPathSamples();
   const auto lines = [](const std::string& name) {
-    return B().u32(0xF4EA1072).u32(0).u32(16).u32(1).text(name).padTo(kHeaderSize).get();
+    return B().u32(0xF4EA1072).u32(0).u32(16).u32(1).text(name).fill(8).padTo(kHeaderSize).get();
   };
   ExpectRefused({
       {"H4R window past the end", 44, Slice(rows[1].bytes, 0, 345)},
-      {"newline directory name without its newline", 48, lines("name")},
-      {"newline directory name of 260", 48,
-       lines(std::string(260, 'n') + "\n" + std::string(8, 0))},
+      {"newline name without its newline", 48, lines("name")},
+      {"newline name of 260", 48, lines(std::string(260, 'n') + "\n")},
       {"BIG offsets going back", 52, B().bytes(rows[3].bytes).patch32(76, 98).get()},
   });
 }

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <cstdint>
+#include <string_view>
 #include <vector>
 
 #include "core/session.h"
@@ -95,5 +96,30 @@ void TextureArchiveReader(ReaderContext& c, unsigned row);
 // Files that are one stream behind a small header (single_stream.cpp): row 0
 // "PACK" compressed file, 1 "Nemo Fi", 2 "l33t", 3 "AVIX", 4 "JDLZ".
 void SingleStreamReader(ReaderContext& c, unsigned row);
+
+// Further counted record directories (counted_records.cpp): row 0 "AWAD",
+// 1 "MJZ0", 2 "MH3 V1.0 ", 3 "VER2", 4 "MQDB", 5 "ezd", 6 "MIX1", 7 "THU3",
+// 8 "SDPA", 9 "LP1C".
+void CountedRecordReader(ReaderContext& c, unsigned row);
+// Directories with type codes and stored paths (typed_paths.cpp): row 0
+// "GABA", 1 "H4R", 2 the newline directory, 3 "BIG", 4 the resource file of
+// signature row 57.
+void TypedPathReader(ReaderContext& c, unsigned row);
+
+// Refuses `count` records of at least `minimum` bytes each that `bytes`
+// cannot hold, before anything is reserved for them.
+inline void NeedRoomFor(uint64_t count, uint64_t bytes, uint64_t minimum) {
+  if (count > bytes / minimum) throw BadData("more records than the directory holds");
+}
+// Names entry `i` after the archive file and its index, then `extension`.
+void NumberEntry(ReaderContext& c, size_t i, std::string_view extension = {});
+// SizesFromOffsets for a directory whose offsets must not go back nor lie
+// past the end of the file; one that does is refused.
+void SizesToNextOffset(ReaderContext& c);
+// Adds `count` records from the start of `directory`: a zero-terminated
+// name, `gap` spare bytes, offset, unpacked and packed size, `tail` spare
+// bytes.
+void ReadNamedSizeRecords(ReaderContext& c, ByteView directory, uint32_t count, uint32_t gap,
+                          uint32_t tail, uint8_t flag);
 
 }  // namespace cairn

@@ -25,7 +25,7 @@ CAIRN_SAMPLES(CountedRecordSamples) {
   ver.text("VER2").u32(2).u32(1).u32(1).name(name24, 24).u32(2).u32(0).name("empty", 24);
   ver.padTo(2048).bytes(sector);
   // Positions are 28 short of the data, whose first bytes tell the extension.
-  const Bytes riff = Join(Text("RIFF"), a), png = Join(Text("\x89PNG"), c);
+  const Bytes riff = Cat({Text("RIFF"), a}), png = Cat({Text("\x89PNG"), c});
   mqdb.text("MQDB").padTo(24).u32(28).u32(3).u32(0).u32(9).u32(52).u32(0).u32(0).u32(14).u32(61);
   mqdb.u32(0).u32(0).u32(5).u32(75).u32(0).bytes(riff).bytes(png).bytes(a);
   const Bytes az = Compress(a), bz = Compress(b);

@@ -56,12 +56,13 @@ CAIRN_SAMPLES(TypedPathSamples) {
   };
 }
 
-// An H4R path whose second character is '\' loses its first.
+// An H4R path whose second character is '\' loses its first, and the '\' it
+// then begins with.
 TEST(TypedPaths, KeepsTheH4rPathQuirkAndRefusesBrokenDirectories) {
   B h4r;
   h4r.text("H4R\x05").u32(8).u32(1).u32(0).u32(0).fill(8).u16(1).text("f").u16(2).text(".\\");
   auto o = OpenBytesAs(44, h4r.u16(1).u16(0).padTo(272).get());
-  EXPECT_EQ(o->listing(), (std::vector<Listed>{{"\\f", 0, 0, 0, 0, 0}}));
+  EXPECT_EQ(o->listing(), (std::vector<Listed>{{"f", 0, 0, 0, 0, 0}}));
   const SampleTable rows = TypedPathSamples();
   const auto lines = [](const std::string& name) {
     return B().u32(0xF4EA1072).u32(0).u32(16).u32(1).text(name).fill(8).padTo(kHeaderSize).get();

@@ -80,7 +80,9 @@ void ReadH4r(ReaderContext& c) {
     const uint64_t tail = 20 + uint64_t{fileLength} + pathLength;
     if (!path.empty()) {
       if (path.size() > 1 && path[1] == '\\') path.erase(0, 1);
-      name = path + name;
+      // Names inside an archive are relative: a path that now begins with
+      // '\' (".\" does) loses it.
+      name = path.substr(std::min(path.size(), path.find_first_not_of('\\'))) + name;
       if (name.size() > 1 && name[1] == ':') name[1] = '_';
     }
     name.resize(std::min(name.size(), name.find('\0')));

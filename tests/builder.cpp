@@ -44,18 +44,17 @@ Bytes Compress(const Bytes& data, int level) {
   return out;
 }
 
-Bytes Pwad(const std::vector<std::pair<std::string, Bytes>>& lumps) {
+Bytes Glb(const std::vector<std::pair<std::string, Bytes>>& files) {
   ArchiveBuilder b;
-  b.text("PWAD").u32(static_cast<uint32_t>(lumps.size())).u32(0);
-  std::vector<uint32_t> at;
-  for (const auto& [name, data] : lumps) {
-    at.push_back(static_cast<uint32_t>(b.size()));
-    b.bytes(data);
+  b.text("GLB2.0").fill(2).u32(static_cast<uint32_t>(files.size())).u32(0);
+  uint32_t offset = std::max<uint32_t>(static_cast<uint32_t>(16 + 28 * files.size()), 104);
+  for (const auto& [name, data] : files) {
+    b.u32(offset).u32(static_cast<uint32_t>(data.size())).name(name, 20);
+    offset += static_cast<uint32_t>(data.size());
   }
-  b.padTo(104).patch32(8, static_cast<uint32_t>(b.size()));
-  for (size_t i = 0; i < lumps.size(); ++i)
-    b.u32(at[i]).u32(static_cast<uint32_t>(lumps[i].second.size())).name(lumps[i].first, 8);
-  return b.get();
+  b.padTo(104);
+  for (const auto& [name, data] : files) b.bytes(data);
+  return b.padTo(104).get();
 }
 
 Bytes ReadFile(const std::string& path) {

@@ -76,9 +76,9 @@ inline Bytes Slice(const Bytes& b, size_t at, size_t n) {
                b.begin() + static_cast<std::ptrdiff_t>(at + n));
 }
 
-// A "PWAD" lump archive: count at 4, directory offset at 8, the lumps, zeros
-// up to 104 bytes, then records of offset, size and an 8-byte name.
-Bytes Pwad(const std::vector<std::pair<std::string, Bytes>>& lumps);
+// A "GLB2.0" archive: count at 8, records of offset, size and a 20-byte name
+// from 16, then the data from 104 on at the latest, zeros up to 104 bytes.
+Bytes Glb(const std::vector<std::pair<std::string, Bytes>>& files);
 
 // A fresh folder under the system's temporary folder, removed afterwards.
 class TempDir {

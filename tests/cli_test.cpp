@@ -55,21 +55,6 @@ ToolRun Cairn(const Strings& args, const std::string& cwd = "") {
   return r;
 }
 
-// A "GLB2.0" archive: count at 8, records of offset, size and a 20-byte name
-// from 16, then the data.
-Bytes Glb(const std::vector<std::pair<std::string, Bytes>>& files) {
-  ArchiveBuilder b;
-  b.text("GLB2.0").fill(2).u32(static_cast<uint32_t>(files.size())).u32(0);
-  uint32_t offset = std::max<uint32_t>(static_cast<uint32_t>(16 + 28 * files.size()), 104);
-  for (const auto& [name, data] : files) {
-    b.u32(offset).u32(static_cast<uint32_t>(data.size())).name(name, 20);
-    offset += static_cast<uint32_t>(data.size());
-  }
-  b.padTo(104);
-  for (const auto& [name, data] : files) b.bytes(data);
-  return b.padTo(104).get();
-}
-
 // The lines between the two rules of a listing; `total` gets the line after.
 Strings ListedRows(const std::string& out, std::string* total = nullptr) {
   const Strings lines = Lines(out);
@@ -123,20 +108,20 @@ TEST(Cli, ListShowsSizesNamesAndTotal) {
             (Strings{"       6         6  README.TXT", " 3000000   3000000  big.bin",
                      "       1         1  docs\\a.txt"}));
   EXPECT_EQ(total, " 3000014   3000014  8 entries");
-  ListedRows(Cairn({"list", dir.write("one.wad", Pwad({{"E1M1", Text("abc")}}))}).out, &total);
+  ListedRows(Cairn({"list", dir.write("one.glb", Glb({{"E1M1", Text("abc")}}))}).out, &total);
   EXPECT_EQ(total, "       3         3  1 entry");
 }
 
 TEST(Cli, AnArchiveThatCannotBeReadIsOneLineWithTheReason) {
   TempDir dir;
-  Bytes broken = Pwad({{"A", Text("x")}});
-  PutU32le(broken, 8, 5000);  // the directory lies past the end
+  Bytes broken = Glb({{"A", Text("x")}});
+  PutU32le(broken, 8, 5000);  // more records than the file holds
   std::vector<std::pair<std::string, std::string>> cases = {
       {dir.path("missing.pak"), "cannot open: no such file"},
       {dir.dir().string(), "cannot open: it is a folder"},
       {dir.write("notes.txt", kPlainText), "not a recognised archive"},
-      {dir.write("short.wad", Slice(broken, 0, 103)), "too short or unreadable"},
-      {dir.write("broken.wad", broken), "damaged or inconsistent directory"}};
+      {dir.write("short.glb", Slice(broken, 0, 103)), "too short or unreadable"},
+      {dir.write("broken.glb", broken), "damaged or inconsistent directory"}};
   for (const DetectCase& c : DetectCases())
     if (FindFormat(c.id)->reader == nullptr && c.companions.empty()) {
       cases.push_back({dir.write(c.fileName, c.bytes),

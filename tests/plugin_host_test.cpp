@@ -105,15 +105,15 @@ TEST(PluginHost, AnswersCapabilitiesContentTestsAndOpenFailures) {
   const Plugin& p = Loaded();
   EXPECT_EQ(p.GetPackerCaps(), 68);
   TempDir dir;
-  Bytes badDirectory = Pwad({{"A", Pattern(10)}});
+  Bytes badDirectory = Glb({{"A", Pattern(10)}});
   PutU32le(badDirectory, 8, 0x7FFFFF00);
   const std::pair<std::string, int> cases[] = {
       {dir.path("missing.wad"), 15},
       {dir.dir().string(), 15},
-      {dir.write("short.wad", Slice(Pwad({}), 0, 103)), 18},
+      {dir.write("short.wad", Slice(Glb({}), 0, 103)), 18},
       {dir.write("junk.bin", Bytes(200, 0xEE)), 14},
       {dir.write("bad.wad", badDirectory), 12},
-      {dir.write("maps.wad", Pwad({{"A", Pattern(10)}})), 0}};
+      {dir.write("maps.glb", Glb({{"A", Pattern(10)}})), 0}};
   for (auto [path, result] : cases) {
     EXPECT_EQ(HostWalk(path, dir).openResult, result) << path;
     EXPECT_EQ(p.CanYouHandleThisFile(path.data()), result == 0 || result == 12) << path;
@@ -158,9 +158,9 @@ TEST(PluginHost, ExtractingWhileWalkingMeetsEveryEntryOnceAndFailuresLeaveNothin
   TempDir dir;
   const Bytes a = Pattern(30, 1), b = Pattern(40, 2), c = Pattern(50, 3);
   // A fourth record whose data lies past the end of the file.
-  ArchiveBuilder w;
-  w.bytes(Pwad({{"A", a}, {"B", b}, {"C", c}})).patch32(4, 4).u32(9999).u32(10).name("D", 8);
-  const std::string path = dir.write("four.wad", w.get());
+  Bytes four = Glb({{"A", a}, {"B", b}, {"C", c}, {"D", Pattern(10)}});
+  PutU32le(four, 16 + 3 * 28, 9999);
+  const std::string path = dir.write("four.glb", four);
   g_reports.clear();
   g_stopAtReport = 3;  // the first chunk of the second entry asks to stop
   const Walk all = HostWalk(path, dir);
@@ -182,7 +182,7 @@ TEST(PluginHost, ExtractingWhileWalkingMeetsEveryEntryOnceAndFailuresLeaveNothin
 TEST(PluginHost, TheCursorKeepsToTheHostsCalls) {
   const Plugin& p = Loaded();
   TempDir dir;
-  std::string path = dir.write("two.wad", Pwad({{"A", Pattern(3)}, {"B", Pattern(4)}}));
+  std::string path = dir.write("two.glb", Glb({{"A", Pattern(3)}, {"B", Pattern(4)}}));
   std::string dest = dir.path("x");
   tOpenArchiveData od{};
   od.ArcName = path.data();
@@ -205,7 +205,7 @@ TEST(PluginHost, TheCursorKeepsToTheHostsCalls) {
   EXPECT_EQ(p.ReadHeader(h, &hd), 10);
   // A second archive opened before the first is closed: the first handle is
   // good only for CloseArchive.
-  std::string path2 = dir.write("one.wad", Pwad({{"C", Pattern(5)}}));
+  std::string path2 = dir.write("one.glb", Glb({{"C", Pattern(5)}}));
   od.ArcName = path2.data();
   void* h2 = p.OpenArchive(&od);
   ASSERT_NE(h2, h);

@@ -96,4 +96,23 @@ void TextureArchiveReader(ReaderContext& c, unsigned row);
 // "PACK" compressed file, 1 "Nemo Fi", 2 "l33t", 3 "AVIX", 4 "JDLZ".
 void SingleStreamReader(ReaderContext& c, unsigned row);
 
+// Chunk chains and compressed directories (level_chunks.cpp): the "TR4"
+// level file and the "SNOK_DATAFILE_KEEP_OUT!" archive.
+void Tr4Reader(ReaderContext& c, unsigned row);
+void SnokReader(ReaderContext& c, unsigned row);
+// A complete zlib stream inflated in memory; refused with BadData when it is
+// broken or would inflate to more than `capacity` bytes.
+std::vector<uint8_t> InflateDirectory(ByteView stream, uint64_t capacity);
+
+// Files walked section by section (sections.cpp): "PALETTEFILES " and the
+// "TEX" texture lists.
+void PaletteFilesReader(ReaderContext& c, unsigned row);
+void TextureListReader(ReaderContext& c, unsigned row);
+
+// Folder trees (nested_trees.cpp): "_ARCHIVE", "RezMgr" and the item-stream
+// tree archive.
+void FolderTableReader(ReaderContext& c, unsigned row);
+void RezMgrReader(ReaderContext& c, unsigned row);
+void ItemTreeReader(ReaderContext& c, unsigned row);
+
 }  // namespace cairn

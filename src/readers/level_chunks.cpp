@@ -54,12 +54,13 @@ std::vector<uint8_t> InflateDirectory(ByteView stream, uint64_t capacity) {
   if (inflateInit(&z) != Z_OK) throw BadData("inflate failed to start");
   z.next_in = const_cast<Bytef*>(stream.data());
   z.avail_in = static_cast<uInt>(stream.size());
+  Bytef none = 0;  // zlib wants somewhere to write even when there is no room
   int r = Z_OK;
   while (r == Z_OK) {
     const size_t done = out.size();
     const size_t room = static_cast<size_t>(std::min<uint64_t>(kStep, capacity - done));
     out.resize(done + room);
-    z.next_out = out.data() + done;
+    z.next_out = room == 0 ? &none : out.data() + done;
     z.avail_out = static_cast<uInt>(room);
     r = inflate(&z, Z_NO_FLUSH);
     out.resize(done + room - z.avail_out);

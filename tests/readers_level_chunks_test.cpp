@@ -8,8 +8,17 @@ namespace cairn::test {
 namespace {
 
 Bytes Tga(uint16_t width, uint16_t height, uint8_t bits, const Bytes& pixels) {
-  return ArchiveBuilder().u8(0).u8(0).u8(2).fill(9).u16(width).u16(height).u8(bits).u8(0x20)
-      .bytes(pixels).get();
+  return ArchiveBuilder()
+      .u8(0)
+      .u8(0)
+      .u8(2)
+      .fill(9)
+      .u16(width)
+      .u16(height)
+      .u8(bits)
+      .u8(0x20)
+      .bytes(pixels)
+      .get();
 }
 
 // A "SNOK" archive of `count` with the data, then the directory inflated from `records`.

@@ -68,8 +68,7 @@ void WalkTableFolder(FolderTables& t, uint32_t folder, const std::string& parent
   const std::string path = FolderPath(parent, TableName(t, f));
   const uint32_t first = f.u16le(4), end = f.u16le(6);
   if (first < t.folderCount && end < t.folderCount) {
-    for (uint32_t child = first; child < end; ++child)
-      WalkTableFolder(t, child, path, depth + 1);
+    for (uint32_t child = first; child < end; ++child) WalkTableFolder(t, child, path, depth + 1);
     return;
   }
   for (uint32_t i = f.u16le(8); i < f.u16le(10); ++i) {

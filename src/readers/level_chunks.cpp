@@ -8,13 +8,14 @@
 //   "TEX32"), each listed after its TGA copy.
 // - "SNOK_DATAFILE_KEEP_OUT!" archive (46): the entry count at 264, and at
 //   272 the position of the directory, one zlib stream to the end of the
-//   file. Inflated it holds 1040-byte records: a zero-terminated name in 1024
-//   bytes, the unpacked size, the stored size. The data lies back to back
-//   from 276 in record order.
+//   file. Inflated it holds exactly that many 1040-byte records: a name
+//   zero-terminated in 1024 bytes, the unpacked size, the stored size. The
+//   data lies back to back from 276 in record order.
 #include <zlib.h>
 
 #include <algorithm>
 #include <array>
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -45,31 +46,40 @@ constexpr uint32_t kSnokData = 276;
 
 }  // namespace
 
-std::vector<uint8_t> InflateDirectory(ByteView stream, uint64_t capacity) {
-  // The output grows with what the stream gives, so a count that promises
-  // more than the stream holds allocates nothing for it.
-  constexpr size_t kStep = 65536;
-  std::vector<uint8_t> out;
-  z_stream z{};
-  if (inflateInit(&z) != Z_OK) throw BadData("inflate failed to start");
-  z.next_in = const_cast<Bytef*>(stream.data());
-  z.avail_in = static_cast<uInt>(stream.size());
-  Bytef none = 0;  // zlib wants somewhere to write even when there is no room
+void InflatePieces(ByteView stream, uint64_t capacity, size_t piece,
+                   const std::function<void(ByteView)>& take) {
+  // Only one piece is held at a time, so a count that promises more than the
+  // stream gives allocates nothing for it.
+  struct Stream {
+    z_stream z{};
+    Stream() {
+      if (inflateInit(&z) != Z_OK) throw BadData("inflate failed to start");
+    }
+    ~Stream() { inflateEnd(&z); }
+  } s;
+  s.z.next_in = const_cast<Bytef*>(stream.data());
+  s.z.avail_in = static_cast<uInt>(stream.size());
+  std::vector<uint8_t> buffer(std::max<size_t>(piece, 1));
+  uint64_t total = 0;
+  size_t filled = 0;
   int r = Z_OK;
   while (r == Z_OK) {
-    const size_t done = out.size();
-    const size_t room = static_cast<size_t>(std::min<uint64_t>(kStep, capacity - done));
-    out.resize(done + room);
-    z.next_out = room == 0 ? &none : out.data() + done;
-    z.avail_out = static_cast<uInt>(room);
-    r = inflate(&z, Z_NO_FLUSH);
-    out.resize(done + room - z.avail_out);
+    const size_t room =
+        static_cast<size_t>(std::min<uint64_t>(buffer.size() - filled, capacity - total));
+    s.z.next_out = buffer.data() + filled;
+    s.z.avail_out = static_cast<uInt>(room);
+    r = inflate(&s.z, Z_NO_FLUSH);
+    filled += room - s.z.avail_out;
+    total += room - s.z.avail_out;
     // A full output that the stream still wants to add to is too much.
-    if (r == Z_OK && out.size() == capacity) r = Z_BUF_ERROR;
+    if (r == Z_OK && total == capacity) r = Z_BUF_ERROR;
+    if (filled == buffer.size()) {
+      take(ByteView(buffer));
+      filled = 0;
+    }
   }
-  inflateEnd(&z);
   if (r != Z_STREAM_END) throw BadData("directory does not inflate");
-  return out;
+  if (filled > 0) take(ByteView(buffer.data(), filled));
 }
 
 void Tr4Reader(ReaderContext& c, unsigned) {
@@ -99,18 +109,17 @@ void SnokReader(ReaderContext& c, unsigned) {
   const uint32_t at = ByteView(head).u32le(8);
   if (at > c.fileSize) throw BadData("directory past the end");
   const std::vector<uint8_t> packed = ReadBlock(c, at, c.fileSize - at);
-  const uint64_t size = uint64_t{count} * kSnokRecord;
-  const std::vector<uint8_t> inflated = InflateDirectory(packed, size);
   // The records are all there or the directory is not.
-  if (inflated.size() != size) throw BadData("directory shorter than its count");
-  const ByteView records(inflated);
+  uint32_t seen = 0;
   uint64_t offset = kSnokData;
-  for (uint32_t i = 0; i < count; ++i) {
-    const ByteView r = records.sub(uint64_t{i} * kSnokRecord, kSnokRecord);
+  InflatePieces(packed, uint64_t{count} * kSnokRecord, kSnokRecord, [&](ByteView r) {
+    if (r.size() < kSnokRecord) throw BadData("record cut short");
     const uint32_t stored = r.u32le(1028);
     AddEntry(c, r.field(0, 1024), DerivedOffset(offset), r.u32le(1024), stored);
     offset += stored;
-  }
+    ++seen;
+  });
+  if (seen != count) throw BadData("directory shorter than its count");
 }
 
 }  // namespace cairn

@@ -2,14 +2,14 @@
 // path, the folder names joined with '\' (a folder with an empty name adds
 // nothing), and listed depth first in the order the tree gives them.
 //
-// - "_ARCHIVE" archive (FormatId 53): the first X bytes of the file (X at 0)
-//   are the directory area; the block at 176 gives the places of its folder
-//   table (12-byte records: name, first and end child folder, first and end
-//   file), its file table (20-byte records: name, 4 unused bytes, offset
-//   from the end of the area, stored size, unpacked size) and its name block,
-//   each as its position minus 180. A folder whose child range lies inside
-//   the table holds folders; any other holds the files of its file range.
-//   Entries whose sizes differ are compressed (Flag 1).
+// - "_ARCHIVE" archive (FormatId 53): the block at 176 gives the size X of
+//   the directory area, the first X bytes of the file, and the places in it
+//   of the folder table (12-byte records: name, first and end child folder,
+//   first and end file), the file table (20-byte records: name, 4 unused
+//   bytes, offset from the end of the area, stored size, unpacked size) and
+//   the name block, each as its position minus 180. A folder whose child
+//   range lies inside the table holds folders; any other holds the files of
+//   its file range. Entries whose sizes differ are compressed (Flag 1).
 // - "RezMgr" archive (54): the root folder block's position and size at 131
 //   and 135. A block is a run of records: a kind (0 file, else folder), a
 //   position and a size, 4 unused bytes, then a folder's zero-terminated name,
@@ -71,7 +71,8 @@ void WalkTableFolder(FolderTables& t, uint32_t folder, const std::string& parent
     for (uint32_t child = first; child < end; ++child) WalkTableFolder(t, child, path, depth + 1);
     return;
   }
-  for (uint32_t i = f.u16le(8); i < f.u16le(10); ++i) {
+  const uint32_t firstFile = f.u16le(8), endFile = f.u16le(10);
+  for (uint32_t i = firstFile; i < endFile; ++i) {
     if (i >= t.fileCount) throw BadData("file outside its table");
     if (t.fileSeen[i]) throw BadData("file listed twice");
     t.fileSeen[i] = true;
@@ -161,9 +162,9 @@ uint64_t WalkItems(ReaderContext& c, ByteView tree, uint64_t at, uint32_t count,
 }  // namespace
 
 void FolderTableReader(ReaderContext& c, unsigned) {
-  const uint32_t areaSize = c.header.u32le(0);
   const std::vector<uint8_t> blockBytes = ReadBlock(c, 176, 26);
   const ByteView block(blockBytes);
+  const uint32_t areaSize = block.u32le(0);
   const std::vector<uint8_t> areaBytes = ReadBlock(c, 0, areaSize);
   const ByteView area(areaBytes);
   const uint32_t folderCount = block.u16le(14), fileCount = block.u16le(20);

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <vector>
 
 #include "core/session.h"
@@ -100,9 +101,12 @@ void SingleStreamReader(ReaderContext& c, unsigned row);
 // level file and the "SNOK_DATAFILE_KEEP_OUT!" archive.
 void Tr4Reader(ReaderContext& c, unsigned row);
 void SnokReader(ReaderContext& c, unsigned row);
-// A complete zlib stream inflated in memory; refused with BadData when it is
-// broken or would inflate to more than `capacity` bytes.
-std::vector<uint8_t> InflateDirectory(ByteView stream, uint64_t capacity);
+// Inflates a complete zlib stream held in memory and hands its bytes to
+// `take` `piece` at a time (the last piece may be shorter). A stream that is
+// broken or would inflate to more than `capacity` bytes is refused with
+// BadData.
+void InflatePieces(ByteView stream, uint64_t capacity, size_t piece,
+                   const std::function<void(ByteView)>& take);
 
 // Files walked section by section (sections.cpp): "PALETTEFILES " and the
 // "TEX" texture lists.

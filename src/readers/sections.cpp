@@ -25,6 +25,7 @@
 namespace cairn {
 namespace {
 
+// A section header ends within this many bytes (fewer at the end of the file).
 constexpr uint32_t kSectionHeaderWindow = 100;
 constexpr std::array<std::string_view, 3> kNameOnlySections = {"MATERIALS", "COLORS", "SOUNDS"};
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <string_view>
 #include <vector>
 
@@ -121,5 +122,27 @@ void SizesToNextOffset(ReaderContext& c);
 // bytes.
 void ReadNamedSizeRecords(ReaderContext& c, ByteView directory, uint32_t count, uint32_t gap,
                           uint32_t tail, uint8_t flag);
+
+// Chunk chains and compressed directories (level_chunks.cpp): the "TR4"
+// level file and the "SNOK_DATAFILE_KEEP_OUT!" archive.
+void Tr4Reader(ReaderContext& c, unsigned row);
+void SnokReader(ReaderContext& c, unsigned row);
+// Inflates a complete zlib stream held in memory and hands its bytes to
+// `take` `piece` at a time (the last piece may be shorter). A stream that is
+// broken or would inflate to more than `capacity` bytes is refused with
+// BadData.
+void InflatePieces(ByteView stream, uint64_t capacity, size_t piece,
+                   const std::function<void(ByteView)>& take);
+
+// Files walked section by section (sections.cpp): "PALETTEFILES " and the
+// "TEX" texture lists.
+void PaletteFilesReader(ReaderContext& c, unsigned row);
+void TextureListReader(ReaderContext& c, unsigned row);
+
+// Folder trees (nested_trees.cpp): "_ARCHIVE", "RezMgr" and the item-stream
+// tree archive.
+void FolderTableReader(ReaderContext& c, unsigned row);
+void RezMgrReader(ReaderContext& c, unsigned row);
+void ItemTreeReader(ReaderContext& c, unsigned row);
 
 }  // namespace cairn

@@ -93,8 +93,9 @@ void Tr4Reader(ReaderContext& c, unsigned) {
     if (i < kAtlases.size()) {
       const Atlas& a = kAtlases[i];
       name += a.extension;
-      // A copy whose name or size would not fit is left out.
-      AddTgaEntry(c, name, offset, stored, 256, unpacked / a.bytesPerRow, a.bytesPerPixel, a.flag);
+      if (!AddTgaEntry(c, name, offset, stored, 256, unpacked / a.bytesPerRow, a.bytesPerPixel,
+                       a.flag))
+        throw BadData("atlas copy that cannot be listed");
       AddEntry(c, name, offset, unpacked, stored, 1);
     } else {
       AddEntry(c, name, offset, stored, stored);

@@ -139,7 +139,7 @@ TEST(Cli, AnArchiveThatCannotBeReadIsOneLineWithTheReason) {
   EXPECT_FALSE(Exists(dir.path("x")));
 }
 
-TEST(Cli, ExtractWritesEntriesIntoTheirFoldersAndKeepsWhatExists) {
+TEST(Cli, ExtractWritesEntriesIntoTheirFolders) {
   TempDir dir;
   const std::string path = WriteGame(dir), out = dir.path("out/new");
   const ToolRun r = Cairn({"extract", path, "-o", out});
@@ -147,17 +147,6 @@ TEST(Cli, ExtractWritesEntriesIntoTheirFoldersAndKeepsWhatExists) {
   EXPECT_EQ(FilesBelow(out), kGame);
   EXPECT_NE(r.out.find("  extracted: docs/a.txt\n"), std::string::npos) << r.out;
   EXPECT_NE(r.out.find("8 entries extracted to " + out + "\n"), std::string::npos);
-  // A file that exists is kept unless --overwrite; the others are written.
-  dir.write("out/new/README.TXT", Text("old"));
-  fs::remove(out + "/empty");
-  const ToolRun kept = Cairn({"extract", path, "-o", out});
-  EXPECT_EQ(kept.status, 3);
-  EXPECT_EQ(kept.errLines().front(),
-            "cairn: " + path + ": README.TXT: already exists (use --overwrite to replace it)");
-  EXPECT_EQ(ReadFile(out + "/README.TXT"), Text("old"));
-  EXPECT_TRUE(Exists(out + "/empty"));
-  EXPECT_EQ(Cairn({"extract", "--overwrite", path, "-o", out}).status, 0);
-  EXPECT_EQ(FilesBelow(out), kGame);
   // Without -o the current folder takes the files; -q prints nothing.
   fs::create_directories(dir.path("here"));
   const ToolRun quiet = Cairn({"extract", "-q", path, "readme.txt"}, dir.path("here"));

@@ -44,6 +44,18 @@ Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>
   return s;
 }
 
+Sample Entries(Sample s, const std::vector<std::pair<Listed, Bytes>>& entries) {
+  for (const auto& [listed, data] : entries) {
+    s.listing.push_back(listed);
+    s.data.push_back(data);
+  }
+  return s;
+}
+
+Bytes With(const Sample& s, size_t at, uint32_t v) {
+  return ArchiveBuilder().bytes(s.bytes).patch32(at, v).get();
+}
+
 void ExpectRefused(FormatId format, const Bytes& bytes, std::string_view fileName) {
   auto o = OpenBytesAs(format, bytes, fileName);
   EXPECT_EQ(o->result, kBadData);

@@ -19,7 +19,7 @@ CAIRN_SAMPLES(ChainedItemSamples) {
   // The byte after each 24-bit length, 0xFF in the first item, is not part of it.
   ArchiveBuilder mna;
   mna.text("MNA").fill(13).u32(1).u32(40 | 0xFF << 24).fill(16).bytes(Pattern(16, 1));
-  mna.u32(2).u32(30).fill(16).bytes(Pattern(6, 2));
+  mna.u32(2).u32(30).fill(16).bytes(Pattern(6, 2)).u32(3).u32(50).fill(16).bytes(Pattern(26, 3));
   const Bytes m = mna.get();
   ArchiveBuilder xfg;
   xfg.text("1XFG").text("LBTC").u32(9).bytes(c).u32(0xDEADBEEF).text("EGMI").u32(1298).bytes(pic);
@@ -34,17 +34,20 @@ CAIRN_SAMPLES(ChainedItemSamples) {
   chunks.listing[2].flag = 1;
   ArchiveBuilder actors;
   actors.name("ACTRHEAD", 8).fill(16, 0xEE).u32(3).u32(4).bytes(Pattern(12, 1));
-  const Bytes act = actors.name("ITEM0001", 8).fill(16, 0xEE).u32(0).u32(5).get();
+  actors.name("ITEM0001", 8).fill(16, 0xEE).u32(10).u32(7).bytes(Pattern(70, 2));
+  const Bytes act = actors.name("ITEM0002", 8).fill(16, 0xEE).u32(0).u32(5).get();
   return {
       Row({"paq", 8, "sample.paq", paq.get()},
           {{"readme.txt", 19, a}, {"dir\\sub.bin", 55, b}, {"last", 364, c}}),
       Row({"VXBG", 27, "sample.vxb", vxbg.get()},
           {{"a.txt", 46, a}, {"b\\c.dat", 66, b}, {"empty", 366, {}}, {"d", 366, c}}),
-      Row({"MNA", 28, "pack.mna", m},
-          {{"pack.mna.000000", 16, Slice(m, 16, 40)}, {"pack.mna.000001", 56, Slice(m, 56, 30)}}),
+      Row({"MNA", 28, "pack.mna", m}, {{"pack.mna.000000", 16, Slice(m, 16, 40)},
+                                       {"pack.mna.000001", 56, Slice(m, 56, 30)},
+                                       {"pack.mna.000002", 86, Slice(m, 86, 50)}}),
       chunks,
       Row({"ACTRHEAD", 45, "actors.act", act}, {{"actors.act.000000", 0, Slice(act, 0, 44)},
-                                                {"actors.act.000001", 44, Slice(act, 44, 32)}}),
+                                                {"actors.act.000001", 44, Slice(act, 44, 102)},
+                                                {"actors.act.000002", 146, Slice(act, 146, 32)}}),
   };
 }
 
@@ -63,7 +66,7 @@ TEST(ChainedItems, RefusesBrokenItems) {
       {"VXBG entries beyond 4 GiB", 27, With(rows[1], 14, 0xFFFFFFF0)},
       {"MNA item of no length", 28, With(rows[2], 60, 0)},
       {"MNA item shorter than its head", 28, With(rows[2], 60, 23)},
-      {"ACTRHEAD item beyond 4 GiB", 45, With(rows[4], 44 + 24, 0x1FFFFFFF)},
+      {"ACTRHEAD item beyond 4 GiB", 45, With(rows[4], 44 + 28, 0x1FFFFFFF)},
   });
 }
 

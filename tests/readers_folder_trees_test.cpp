@@ -69,8 +69,7 @@ TEST(FolderTrees, RefusesLoopsAndCountsBeyondTheFile) {
   const SampleTable rows = FolderTreeSamples();
   std::string path = "d";
   for (int k = 1; k < 63; ++k) path += "\\d";
-  auto o = OpenBytesAs(21, NestedFolders(63, "d"));
-  EXPECT_EQ(o->listing(), (std::vector<Listed>{{path + "\\f", 88 * 64, 4, 4, 0, 0}}));
+  ExpectLists(21, NestedFolders(63, "d"), {{path + "\\f", 88 * 64, 4, 4, 0, 0}});
   ExpectRefused({
       {"DATOS folder whose list starts with itself", 21, With(rows[0], 44 + 40, 44)},
       {"DATOS 64 levels", 21, NestedFolders(64, "d")},

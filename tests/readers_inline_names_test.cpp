@@ -70,8 +70,7 @@ TEST(InlineNames, RefusesBadDirectories) {
     w.text("FAR!byAZ").u32(0).u32(16).u32(1).u32(4).u32(0).u32(0).u32(n);
     return w.text(std::string(n, 'F')).get();
   };
-  auto o = OpenBytesAs(3, far(259));
-  EXPECT_EQ(o->listing(), (std::vector<Listed>{{std::string(259, 'F'), 0, 4, 4, 0, 0}}));
+  ExpectLists(3, far(259), {{std::string(259, 'F'), 0, 4, 4, 0, 0}});
   ExpectRefused({
       {"FAR name of 260", 3, far(260)},
       {"MHX region end below 448", 1, With(rows[0], 48, 447)},

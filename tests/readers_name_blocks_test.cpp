@@ -53,8 +53,7 @@ TEST(NameBlocks, RefusesNamesOutsideTheirBlocks) {
   ArchiveBuilder longest;
   longest.text("DWFB").padTo(72).u32(1).u32(128).u32(260).padTo(88).u32(0).u32(128).u32(260);
   longest.u32(0).u32(8).padTo(128).text(std::string(259, 'n')).u8(0);
-  auto o = OpenBytesAs(31, longest.get());
-  EXPECT_EQ(o->listing(), (std::vector<Listed>{{std::string(259, 'n'), 0, 8, 8, 0, 0}}));
+  ExpectLists(31, longest.get(), {{std::string(259, 'n'), 0, 8, 8, 0, 0}});
   ExpectRefused({
       {"AFS name block too small for the second name", 9, With(rows[0], 28, 79)},
       {"AFS no room before the first entry", 9, With(rows[1], 8, 4)},

@@ -56,6 +56,12 @@ Bytes With(const Sample& s, size_t at, uint32_t v) {
   return ArchiveBuilder().bytes(s.bytes).patch32(at, v).get();
 }
 
+void ExpectLists(FormatId format, const Bytes& bytes, const std::vector<Listed>& listing) {
+  auto o = OpenBytesAs(format, bytes);
+  EXPECT_EQ(o->result, kOk);
+  EXPECT_EQ(o->listing(), listing);
+}
+
 void ExpectRefused(FormatId format, const Bytes& bytes, std::string_view fileName) {
   auto o = OpenBytesAs(format, bytes, fileName);
   EXPECT_EQ(o->result, kBadData);

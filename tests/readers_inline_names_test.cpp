@@ -27,10 +27,9 @@ CAIRN_SAMPLES(InlineNameSamples) {
     return w.u32(0xFFFFFFFF).u32(25).u32(70).u32(0x2222).name(second, width).get();
   };
   ArchiveBuilder dir;
-  dir.text("DIR").u8(0).u32(4104 + 64).u32(0).bytes(a).bytes(b).padTo(4104);
+  dir.text("DIR").u8(0).u32(4104 + 44).u32(0).bytes(a).bytes(b).padTo(4104);
   dir.u32(12).u32(5).text("abc").u8(0).u32(0xDEADBEEF);
   dir.u32(17).u32(70).text("docs/read.me").u32(0).u32(0xDEADBEEF);
-  dir.u32(4104).u32(0).text("abcd").u32(0).u32(0xDEADBEEF);
   ArchiveBuilder far;
   far.text("FAR!byAZ").u32(0).u32(91).bytes(a).bytes(b).u32(2);
   far.u32(5).u32(0x99).u32(16).u32(8).text("FIRST.DA");
@@ -53,8 +52,7 @@ CAIRN_SAMPLES(InlineNameSamples) {
       Row({"PFF2", 19, "data.pff", pff('2', 16, "snd/b.wav")},
           {{"TITLE.BMP", 20, a}, {"snd\\b.wav", 25, b}}),
       Row({"PFF3", 20, "data.pff", pff('3', 20, q)}, {{"TITLE.BMP", 20, a}, {q, 25, b}}),
-      Row({"DIR", 2, "data.dir", dir.get()},
-          {{"abc", 12, a}, {"docs\\read.me", 17, b}, {"abcd", 4104, {}}}),
+      Row({"DIR", 2, "data.dir", dir.get()}, {{"abc", 12, a}, {"docs\\read.me", 17, b}}),
       Row({"FAR!byAZ", 3, "x.far", far.get()}, {{"FIRST.DA", 16, a}, {"dir\\second", 21, b}}),
       Row({"DFP1", 18, "x.dfp", dfp1.get()}, {{"one.txt", 29, a}, {"two\\three.dat", 34, b}}),
       Row({"CMPR", 30, "x.cmp", cmpr.get()}, {{"a.bin", 8, a}, {"data\\b.x", 13, b}}),

@@ -157,9 +157,8 @@ CAIRN_SAMPLES(TableSamples) {
       Table("signature row 42, 64-byte grid", 42, "movies.dat", grid,
             {{"a.smk", 4096, 100}, {"b.dat", 4224, 3000}, {"c.txt", 7232, 10}},
             [](B& b, auto& n, auto& e) { b.name(n, 23).u8(1).u32(0x44332211).u32(e.size); }),
-      // The directory would begin at 2048, past the end: it is not read.
-      Table("signature row 42, empty", 42, "movies.dat",
-            B().u32(0x51890ACE).u32(3).u32(0).padTo(104), {}, nullptr),
+      Table("signature row 42, no records: the directory past the end is not read", 42,
+            "movies.dat", B().u32(0x51890ACE).u32(3).u32(0).padTo(104), {}, nullptr),
       Table("zero bytes in a 40-byte name stand for dots", 85, "files.res", B().u32(3),
             {{"README.TXT", 148, 20}, {"A..TXT", 168, 15}, {"MUSIC.MID", 183, 30}},
             [](B& b, auto& n, auto& e) {

@@ -85,7 +85,6 @@ std::vector<Row> Rows() {
   const Bytes wad2 = Cat({Bytes(8), {16}}), pack = Cat({Bytes(100), {16}}), d13 = Pattern(13);
   const Bytes px = Pattern(64), z = Compress(px), tex = Pattern(32), bgra = Pattern(8, 30);
   const auto zs = static_cast<uint32_t>(z.size());
-  // 78: u16 colour count, the colours, the picture size, the pixels.
   const Bytes many = Cat({Le({300}, 2), Pattern(900), Le({0}), {7}});
   const Bytes chunk = Cat({Bytes(39), Text("tex"), Bytes(5), {1, 2, 3, 4, 5, 6, 7, 8}, Bytes(52)});
   const Bytes c111 = Cat({Bytes(33), {0, 1, 2, 1}, Le({2}), {10, 20, 30, 40, 50, 60, 70, 80}});

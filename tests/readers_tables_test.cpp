@@ -21,9 +21,8 @@ struct At {
 // Writes the record of an entry; `name` as stored, '/' between path parts.
 using Record = void (*)(B& b, const std::string& name, const At& e);
 
-// A row whose entries are stored as they are, each listing its offset and
-// its size twice: `head`, a record for each entry, then data up to the end
-// of the last entry.
+// A row of entries stored as they are: `head`, a record for each entry, then
+// data up to the end of the last entry.
 Sample Table(std::string label, FormatId id, std::string fileName, B head,
              const std::vector<At>& entries, Record record) {
   Sample s{std::move(label), id, std::move(fileName), {}, {}, {}};
@@ -57,7 +56,6 @@ Bytes GreyTga(uint16_t width, uint16_t height, uint8_t descriptor, const Bytes& 
   return w.get();
 }
 
-// A WAD directory record: offset, size, 8 bytes the listing skips, name[16].
 void WadRecord(B& w, uint32_t offset, uint32_t size, std::string_view name) {
   w.u32(offset).u32(size).u32(size).u32(0x44).name(name, 16);
 }
@@ -72,14 +70,13 @@ Sample Wad2() {
   WadRecord(w, 12, 16, "PICTURE");
   WadRecord(w, 28, 8, "0123456789abcdef");  // fills the field
   WadRecord(w, 128, 4, "tail");
-  return Sample{"WAD2", 4, "gfx.wad", w.get(),
-             {{"PICTURE", 12, 16, 16, 0, 0},
-              {"_TO_TGA_\\PICTURE.tga", 12, 4 * 2 * 3 + 18, 16, 4 | 2 << 16, 1},
-              {"0123456789abcdef", 28, 8, 8, 0, 0},
-              {"_TO_TGA_\\0123456789abcdef.tga", 28, 18, 8, 0, 1},
-              {"tail", 128, 4, 4, 0, 0}},
-             {picture, GreyTga(4, 2, 0x21, {0x00, 0x0F, 0x1F, 0x2F, 0xEB, 0xDB, 0xCB, 0xBB}),
-              Bytes(8), GreyTga(0, 0, 0x21, {}), Bytes(4)}};
+  return Entries({"WAD2", 4, "gfx.wad", w.get()},
+                 {{{"PICTURE", 12, 16, 16, 0, 0}, picture},
+                  {{"_TO_TGA_\\PICTURE.tga", 12, 4 * 2 * 3 + 18, 16, 4 | 2 << 16, 1},
+                   GreyTga(4, 2, 0x21, {0x00, 0x0F, 0x1F, 0x2F, 0xEB, 0xDB, 0xCB, 0xBB})},
+                  {{"0123456789abcdef", 28, 8, 8, 0, 0}, Bytes(8)},
+                  {{"_TO_TGA_\\0123456789abcdef.tga", 28, 18, 8, 0, 1}, GreyTga(0, 0, 0x21, {})},
+                  {{"tail", 128, 4, 4, 0, 0}, Bytes(4)}});
 }
 
 // "WAD3": a mip texture (pixels at 40) and a plain picture (pixels at 8),
@@ -97,12 +94,11 @@ Sample Wad3() {
   WadRecord(w, 12, 816, "brick");
   WadRecord(w, 828, 784, "conchars");
   const Bytes tga = GreyTga(2, 2, 0x20, {250, 249, 248, 55});
-  return Sample{"WAD3", 5, "halflife.wad", w.get(),
-             {{"brick", 12, 816, 816, 0, 0},
-              {"_TO_TGA_\\brick.tga", 12, 2 * 2 * 3 + 18, 816, 2 | 2 << 16, 1},
-              {"conchars", 828, 784, 784, 0, 0},
-              {"_TO_TGA_\\conchars.tga", 828, 2 * 2 * 3 + 18, 784, 2 | 2 << 16, 2}},
-             {mip.get(), tga, plain.get(), tga}};
+  return Entries({"WAD3", 5, "halflife.wad", w.get()},
+                 {{{"brick", 12, 816, 816, 0, 0}, mip.get()},
+                  {{"_TO_TGA_\\brick.tga", 12, 2 * 2 * 3 + 18, 816, 2 | 2 << 16, 1}, tga},
+                  {{"conchars", 828, 784, 784, 0, 0}, plain.get()},
+                  {{"_TO_TGA_\\conchars.tga", 828, 2 * 2 * 3 + 18, 784, 2 | 2 << 16, 2}, tga}});
 }
 
 // The "PACK" directory archive: a picture with its size at 0 and 4, one
@@ -115,15 +111,15 @@ Sample Pack() {
   const std::string full(56, 'p');
   w.text("PACK").u32(134).u32(2 * 64 + 40).bytes(first).bytes(second.get());
   w.name("gfx/first.lmp", 56).u32(12).u32(14).name(full, 56).u32(26).u32(108).fill(40, 0x13);
-  return Sample{"PACK directory", 70, "pak0.pak", w.get(),
-             {{"gfx\\first.lmp", 12, 14, 14, 0, 0},
-              {"_TO_TGA_\\gfx\\first.lmp.tga", 12, 3 * 2 * 3 + 18, 14, 3 | 2 << 16, 1},
-              {full, 26, 108, 108, 0, 0},
-              {"_TO_TGA_\\" + full + ".tga", 26, 2 * 4 * 3 + 18, 108, 2 | 4 << 16, 2}},
-             {first, GreyTga(3, 2, 0x21, {0x0F, 0x1F, 0x2F, 0x3F, 0x4B, 0x5B}), second.get(),
-              GreyTga(2, 4, 0x21, {0x8B, 0x7B, 0x6B, 0x5B, 0x4B, 0x3F, 0x2F, 0x1F})},
-             {},
-             false};
+  Sample s = Entries({"PACK directory", 70, "pak0.pak", w.get()},
+                     {{{"gfx\\first.lmp", 12, 14, 14, 0, 0}, first},
+                      {{"_TO_TGA_\\gfx\\first.lmp.tga", 12, 3 * 2 * 3 + 18, 14, 3 | 2 << 16, 1},
+                       GreyTga(3, 2, 0x21, {0x0F, 0x1F, 0x2F, 0x3F, 0x4B, 0x5B})},
+                      {{full, 26, 108, 108, 0, 0}, second.get()},
+                      {{"_TO_TGA_\\" + full + ".tga", 26, 2 * 4 * 3 + 18, 108, 2 | 4 << 16, 2},
+                       GreyTga(2, 4, 0x21, {0x8B, 0x7B, 0x6B, 0x5B, 0x4B, 0x3F, 0x2F, 0x1F})}});
+  s.recognised = false;
+  return s;
 }
 
 const std::string kName38 = std::string(34, 'y') + ".txt", kName80 = std::string(76, 'x') + ".dat";
@@ -131,7 +127,6 @@ const std::string kName256 = "sfx\\" + std::string(248, 'z') + ".wav";
 
 CAIRN_SAMPLES(TableSamples) {
   const B grid = B().u32(0x51890ACE).u32(3).u32(3).padTo(2048);
-  // "LOD" entries are zlib streams.
   const Bytes intro = Text("The castle gate opens at dawn. The castle gate closes at dusk.\n");
   const Bytes map = Pattern(300, 27), introZ = Compress(intro), mapZ = Compress(map);
   const auto introSize = static_cast<uint32_t>(introZ.size());
@@ -156,18 +151,14 @@ CAIRN_SAMPLES(TableSamples) {
       Table("DorbaMistfel, data back to back", 24, "group.grp", B().text("DorbaMistfel").u32(3),
             {{"sky.tga", 64, 30}, {"empty.txt", 94, 0}, {"font.fnt", 94, 25}},
             [](B& b, auto& n, auto& e) { b.name(n, 12).u32(e.size); }),
-      // Records at 2048 whose offset fields are not offsets; the data lies from
-      // 4096 on a grid of 2048 bytes, or of 64 when the byte after the first
-      // name is not 0.
       Table("signature row 42, 2048-byte grid", 42, "movies.dat", grid,
             {{"a.smk", 4096, 100}, {"b.dat", 6144, 3000}, {"c.txt", 10240, 10}},
             [](B& b, auto& n, auto& e) { b.name(n, 23).u8(0).u32(0x44332211).u32(e.size); }),
       Table("signature row 42, 64-byte grid", 42, "movies.dat", grid,
             {{"a.smk", 4096, 100}, {"b.dat", 4224, 3000}, {"c.txt", 7232, 10}},
             [](B& b, auto& n, auto& e) { b.name(n, 23).u8(1).u32(0x44332211).u32(e.size); }),
-      // The directory would begin at 2048, past the end: it is not read.
-      Table("signature row 42, empty", 42, "movies.dat",
-            B().u32(0x51890ACE).u32(3).u32(0).padTo(104), {}, nullptr),
+      Table("signature row 42, no records: the directory past the end is not read", 42,
+            "movies.dat", B().u32(0x51890ACE).u32(3).u32(0).padTo(104), {}, nullptr),
       Table("zero bytes in a 40-byte name stand for dots", 85, "files.res", B().u32(3),
             {{"README.TXT", 148, 20}, {"A..TXT", 168, 15}, {"MUSIC.MID", 183, 30}},
             [](B& b, auto& n, auto& e) {
@@ -184,18 +175,13 @@ CAIRN_SAMPLES(TableSamples) {
       Table("80-byte names in padded records", 114, "world.rss", B().u32(2),
             {{"maps\\town.map", 188, 16}, {"maps\\cave.map", 204, 8}},
             [](B& b, auto& n, auto& e) { b.name(n, 80).u32(e.offset).u32(e.size).u32(~0u); }),
-      // The count is 16 bits wide, the first name follows it; the size comes
-      // first and the offset is stored 2 short.
+      // A 16-bit count, the first name right behind it; recognition wants 4 records.
       Table("14-byte names", 105, "tiles.res", B().u16(4),
-            {{"GRASS.BMP", 90, 10},
-             {"STONE.BMP", 100, 20},
-             {"MUD.BMP", 120, 5},
-             {"SAND.BMP", 125, 15}},
+            {{"GRASS.BMP", 90, 10}, {"STONE.BMP", 100, 20}, {"MUD", 120, 5}, {"SAND", 125, 15}},
             [](B& b, auto& n, auto& e) { b.name(n, 14).u32(e.size).u32(e.offset - 2); }),
-      Sample{"LOD, zlib entries", 10, "h3bitmap.lod", lod.get(),
-          {{"intro.txt", 156, 63, introSize, 0, 0},
-           {"map.dat", 156 + introSize, 300, mapSize, 0, 0}},
-          {intro, map}},
+      Entries({"LOD, zlib entries", 10, "h3bitmap.lod", lod.get()},
+              {{{"intro.txt", 156, 63, introSize, 0, 0}, intro},
+               {{"map.dat", 156 + introSize, 300, mapSize, 0, 0}, map}}),
       Table("CSid", 11, "sprites.csd", B().text("CSid").u16(3),
             {{"SPRITE.SHP", 69, 20}, {"PALETTE.PAL", 89, 10}, {"ICONS.ICN", 99, 15}},
             [](B& b, auto& n, auto& e) { b.u8(0x99).name(n, 12).u32(e.size).u32(e.offset); }),
@@ -217,7 +203,6 @@ CAIRN_SAMPLES(TableSamples) {
       Table("136-byte records", 118, "stage.res", B().u32(2),
             {{"first.txt", 276, 9}, {kName38, 285, 17}},
             [](B& b, auto& n, auto& e) { b.name(n, 38).fill(90).u32(e.offset).u32(e.size); }),
-      // Sizes only: the data follows the directory, each entry on a 4-byte grid.
       Table("size-prefixed 52-byte names", 122, "pack.res", B().u32(193).u32(3),
             {{"a.txt", 176, 5}, {"bb.txt", 184, 8}, {"c", 192, 1}},
             [](B& b, auto& n, auto& e) { b.u32(e.size).name(n, 52); }),

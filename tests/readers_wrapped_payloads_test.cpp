@@ -63,8 +63,8 @@ Bytes Nemo(uint32_t zlib, const Bytes& part0, uint32_t size0, const Bytes& part1
 
 CAIRN_SAMPLES(WrappedPayloadSamples) {
   const Bytes bonus = Zip(kZip, true, "a comment"), extras = Zip(kZip);
-  B gzip, video, mp3, sound, iff, rle, avix, tga, jdlz;
-  gzip.u8(0x1F).u8(0x8B).u8(8).fill(6).u8(3).bytes(Pattern(100, 47));
+  B video, mp3, sound, iff, rle, avix, tga, jdlz;
+  const Bytes gz = Cat({{0x1F, 0x8B, 8}, Bytes(6), {3}, Pattern(100, 47)});
   // The magic's last byte is the video's first.
   video.text("\x55\x42\x56\x9E\x01\xF1\x53\x4B\xFE\xD0\x42\x1E\x4B\x4D\xDD\x78\xF1\x41\x01\x78");
   video.text("\x80\x08\x9E\x38\x1F\x13\xA8\xD3\x6C\xFC").text("BIKi").bytes(Pattern(100, 48));
@@ -86,42 +86,36 @@ CAIRN_SAMPLES(WrappedPayloadSamples) {
   tga.fill(2).u8(2).fill(9).u16(8).u16(5).u8(16).u8(0x20).bytes(pixels);
   // A literal 'a', then a match of distance 1 and length 10: eleven 'a'.
   jdlz.text("JDLZ").u8(2).fill(3).u32(11).u32(16 + 5).u8(2).u8(1).text("a").u8(0).u8(7);
-  const uint32_t zipSize = Size(bonus), strippedSize = Size(extras);
   return {
-      Sample{"F5CD", 32, "BONUS", Zip(kScrambled, true, "a comment"),
-          {{"BONUS.zip", 0, zipSize, zipSize, 0, 0}}, {bonus}},
-      Sample{"IPF1", 33, "extras.ipf", Zip(kStripped, false),
-          {{"extras.zip", 0, strippedSize, strippedSize, 0, 0}}, {extras}},
-      Sample{"H4CAMPAIGN", 43, "campaign.h4c", B().text("H4CAMPAIGN").fill(5).bytes(gzip.get()).get(),
-          {{"campaign.gz", 15, 110, 110, 0, 0}}, {gzip.get()}},
-      Sample{"signature row 51", 51, "movie.vid", video.get(), {{"movie.bik", 30, 104, 104, 0, 0}},
-          {Slice(video.get(), 30, 104)}},
-      Sample{"signature row 55", 55, ".snd", sound.get(), {{".snd.mp3", 19, 104, 104, 0, 0}},
-          {mp3.get()}},
-      Sample{"CPAL savegame 3.3", 56, "save01.sav",
-          B().text("CPAL savegame 3.3\n\n").u8(0).u32(600).bytes(saveZ).get(),
-          {{"save01", 24, 600, Size(saveZ), 0, 1}}, {save}},
-      Sample{"XOR-scrambled sound", 101, "my.game.adf", xored, {{"my.game.mp3", 0, 200, 200, 0, 0x6B}},
-          {tune}},
-      Sample{"size-prefixed zlib", 147, "level.clz", B().u32(400).bytes(levelZ).get(),
-          {{"level", 4, 400, Size(levelZ), 0, 1}}, {level}},
-      Sample{"wrapped IFF", 155, "picture.iff",
-          B().text("XXXXXXXXXXXXXXXX").bytes(Slice(iff.get(), 16, 96)).get(),
-          {{"picture.iff", 0, 112, 112, 0, 0}}, {iff.get()}},
-      Sample{"PACK run-length", 7, "LEVEL", rle.get(), {{"LEVEL.unk", 14, 7, 90, 0, 0}},
-          {Text("abczzzz")}},
-      Sample{"Nemo Fi, stored", 35, "movie.nfi", Nemo(0, nemo0, 30, nemo1, 20),
-          {{"movie.nfi0", 64, 30, 30, 0, 0}, {"movie.nfi1", 94, 20, 20, 0, 0}}, {nemo0, nemo1}},
-      Sample{"Nemo Fi, zlib", 35, "movie.nfi", Nemo(7, nemoZ0, 30, nemoZ1, 20),
-          {{"movie.nfi0", 64, 30, Size(nemoZ0), 0, 1},
-           {"movie.nfi1", 64 + Size(nemoZ0), 20, Size(nemoZ1), 0, 1}},
-          {nemo0, nemo1}},
-      Sample{"l33t", 37, "intro.dat", B().text("l33t").u32(90).bytes(l33tZ).get(),
-          {{"intro", 8, 90, Size(l33tZ), 0, 0}}, {l33t}},
-      Sample{"AVIX", 47, "pic.v2.avx", avix.get(), {{"pic.v2.tga", 24, 98, 80, 8 | 5 << 16, 16}},
-          {tga.get()}},
-      Sample{"JDLZ", 50, ".tex", jdlz.padTo(kHeaderSize).get(), {{".tex", 16, 11, 5, 0, 0}},
-          {Bytes(11, 'a')}},
+      Row({"F5CD", 32, "BONUS", Zip(kScrambled, true, "a comment")}, {{"BONUS.zip", 0, bonus}}),
+      Row({"IPF1", 33, "extras.ipf", Zip(kStripped, false)}, {{"extras.zip", 0, extras}}),
+      Row({"H4CAMPAIGN", 43, "campaign.h4c", Cat({Text("H4CAMPAIGN"), Bytes(5), gz})},
+          {{"campaign.gz", 15, gz}}),
+      Row({"signature row 51", 51, "movie.vid", video.get()},
+          {{"movie.bik", 30, Slice(video.get(), 30, 104)}}),
+      Row({"signature row 55", 55, ".snd", sound.get()}, {{".snd.mp3", 19, mp3.get()}}),
+      Entries({"CPAL savegame 3.3", 56, "save01.sav",
+               B().text("CPAL savegame 3.3\n\n").u8(0).u32(600).bytes(saveZ).get()},
+              {{{"save01", 24, 600, Size(saveZ), 0, 1}, save}}),
+      Entries({"XOR-scrambled sound", 101, "my.game.adf", xored},
+              {{{"my.game.mp3", 0, 200, 200, 0, 0x6B}, tune}}),
+      Entries({"size-prefixed zlib", 147, "level.clz", B().u32(400).bytes(levelZ).get()},
+              {{{"level", 4, 400, Size(levelZ), 0, 1}, level}}),
+      Row({"wrapped IFF", 155, "picture.iff", Cat({Bytes(16, 'X'), Slice(iff.get(), 16, 96)})},
+          {{"picture.iff", 0, iff.get()}}),
+      Entries({"PACK run-length", 7, "LEVEL", rle.get()},
+              {{{"LEVEL.unk", 14, 7, 90, 0, 0}, Text("abczzzz")}}),
+      Row({"Nemo Fi, stored", 35, "movie.nfi", Nemo(0, nemo0, 30, nemo1, 20)},
+          {{"movie.nfi0", 64, nemo0}, {"movie.nfi1", 94, nemo1}}),
+      Entries({"Nemo Fi, zlib", 35, "movie.nfi", Nemo(7, nemoZ0, 30, nemoZ1, 20)},
+              {{{"movie.nfi0", 64, 30, Size(nemoZ0), 0, 1}, nemo0},
+               {{"movie.nfi1", 64 + Size(nemoZ0), 20, Size(nemoZ1), 0, 1}, nemo1}}),
+      Entries({"l33t", 37, "intro.dat", B().text("l33t").u32(90).bytes(l33tZ).get()},
+              {{{"intro", 8, 90, Size(l33tZ), 0, 0}, l33t}}),
+      Entries({"AVIX", 47, "pic.v2.avx", avix.get()},
+              {{{"pic.v2.tga", 24, 98, 80, 8 | 5 << 16, 16}, tga.get()}}),
+      Entries({"JDLZ", 50, ".tex", jdlz.padTo(kHeaderSize).get()},
+              {{{".tex", 16, 11, 5, 0, 0}, Bytes(11, 'a')}}),
   };
 }
 

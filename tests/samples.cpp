@@ -44,6 +44,24 @@ Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>
   return s;
 }
 
+Sample Entries(Sample s, const std::vector<std::pair<Listed, Bytes>>& entries) {
+  for (const auto& [listed, data] : entries) {
+    s.listing.push_back(listed);
+    s.data.push_back(data);
+  }
+  return s;
+}
+
+Bytes With(const Sample& s, size_t at, uint32_t v) {
+  return ArchiveBuilder().bytes(s.bytes).patch32(at, v).get();
+}
+
+void ExpectLists(FormatId format, const Bytes& bytes, const std::vector<Listed>& listing) {
+  auto o = OpenBytesAs(format, bytes);
+  EXPECT_EQ(o->result, kOk);
+  EXPECT_EQ(o->listing(), listing);
+}
+
 void ExpectRefused(FormatId format, const Bytes& bytes, std::string_view fileName) {
   auto o = OpenBytesAs(format, bytes, fileName);
   EXPECT_EQ(o->result, kBadData);

@@ -40,6 +40,15 @@ std::string WriteSample(const Sample& s, const std::filesystem::path& dir);
 // (listed name, offset, bytes).
 Sample Row(Sample s, const std::vector<std::tuple<std::string, uint32_t, Bytes>>& entries);
 
+// The row `s` with entries given as listed, each with the bytes extracting it writes.
+Sample Entries(Sample s, const std::vector<std::pair<Listed, Bytes>>& entries);
+
+// The bytes of row `s` with the u32 at `at` set to `v`: a row broken in one word.
+Bytes With(const Sample& s, size_t at, uint32_t v);
+
+// An archive that opens as `format` with exactly `listing`, such as one at a bound.
+void ExpectLists(FormatId format, const Bytes& bytes, const std::vector<Listed>& listing);
+
 // An archive that opening as `format` must refuse: OpenResult 12, no table
 // and no open file left.
 void ExpectRefused(FormatId format, const Bytes& bytes, std::string_view fileName = "test.bin");

@@ -49,7 +49,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {33, "ipf1", "\"F5CD\", \"IPF1\" wrappers", SingleEntryReader, 2, RawCopy},
     {34, "pwad", "\"IWAD\", \"PWAD\" lump archives", RecordTableReader, 6, RawCopy},
     {35, "nemo", "\"Nemo Fi\" two-part file", SingleStreamReader, 1, RawOrInflate},
-    {36, "objpkg", "object package", nullptr, 0, RawCopy},
+    {36, "objpkg", "object package", ObjectPackageReader, 0, RawCopy},
     {37, "l33t", "\"l33t\" compressed file", SingleStreamReader, 2, Inflate},
     {38, "pvol", "\"PVOL\" archive", PvolReader, 0, RawCopy},
     {39, "tr4", "\"TR4\" level file", nullptr, 0, TgaThenInflate},

@@ -96,6 +96,9 @@ void TextureArchiveReader(ReaderContext& c, unsigned row);
 // "PACK" compressed file, 1 "Nemo Fi", 2 "l33t", 3 "AVIX", 4 "JDLZ".
 void SingleStreamReader(ReaderContext& c, unsigned row);
 
+// The object package with name, export and import tables (object_package.cpp).
+void ObjectPackageReader(ReaderContext& c, unsigned row);
+
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);

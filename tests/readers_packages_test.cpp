@@ -1,0 +1,75 @@
+// Samples and refusals of the object package (36).
+#include <gtest/gtest.h>
+
+#include "samples.h"
+
+namespace cairn::test {
+namespace {
+
+// A compact integer: sign, more and six bits, then seven bits and more a byte.
+Bytes Compact(int32_t v) {
+  uint32_t m = v < 0 ? 0u - static_cast<uint32_t>(v) : static_cast<uint32_t>(v);
+  Bytes b{uint8_t((v < 0 ? 0x80 : 0) | (m >= 0x40 ? 0x40 : 0) | (m & 0x3F))};
+  for (m >>= 6; m > 0; m >>= 7) b.push_back(uint8_t((m >= 0x80 ? 0x80 : 0) | (m & 0x7F)));
+  return b;
+}
+
+CAIRN_SAMPLES(PackageSamples) {
+  const Bytes music = Pattern(20, 1), sound = Pattern(30, 2), text = Pattern(12, 3);
+  const Bytes thing = Pattern(10, 4), ogg = Pattern(25, 5), object = Pattern(16, 6);
+  // Version 69: compact values, one byte before each name; the classes are
+  // imports, the first name or an export.
+  ArchiveBuilder a;
+  a.u32(0x9E2A83C1).u16(69).u16(0).u32(0).u32(9).u32(36).u32(5).u32(0).u32(3).u32(0);
+  for (const char* n :
+       {"mod", "Music", "Sound", "TextBuffer", "wav", "tune", "boom", "notes", "Thing"})
+    a.u8(0).text(n).u8(0).u32(0);
+  a.patch32(32, a.size());
+  for (uint8_t n : {1, 2, 3}) a.u8(0).u8(0).u32(0).u8(n);
+  const uint32_t o0 = a.fill(6).u8(20).bytes(music).size() - 27;
+  const uint32_t o1 = a.u8(0).u8(4).fill(4).u8(0).u8(5).bytes(sound).size() - 38;
+  const uint32_t o2 = a.fill(9).u8(13).bytes(text).size() - 22, o3 = a.bytes(thing).size() - 10;
+  a.patch32(24, a.size());
+  for (auto [cls, name, size, offset] : {std::tuple{-1, 5, 27u, o0},
+                                         {-2, 6, 38u, o1},
+                                         {-3, 7, 22u, o2},
+                                         {0, 8, 10u, o3},
+                                         {4, 7, 0u, 0u}}) {
+    a.bytes(Compact(cls)).u8(0).u32(0).bytes(Compact(name)).u32(0).bytes(Compact(size));
+    if (size > 0) a.bytes(Compact(offset));
+  }
+  // Version 128: 32-bit values, four bytes before each name; the export
+  // table ends the file, inside the window read for it.
+  ArchiveBuilder b;
+  b.u32(0x9E2A83C1).u16(128).u16(0).u32(0).u32(5).u32(36).u32(2).u32(0).u32(1).u32(0);
+  for (const char* n : {"None", "Sound", "ogg", "hit", "Object"}) b.u32(0).text(n).u8(0).u32(0);
+  b.patch32(32, b.size()).u32(0).u32(0).u32(0).u32(1);
+  const uint32_t p0 = b.u8(0).u8(2).fill(6).u32(3).fill(11).bytes(ogg).size() - 48;
+  const uint32_t p1 = b.bytes(object).size() - 16;
+  b.patch32(24, b.size()).u32(-1).u32(0).u32(0).u32(3).u32(0).u32(48).u32(p0);
+  b.u32(0).u32(0).u32(0).u32(4).u32(0).u32(16).u32(p1);
+  return {
+      Row({"object package 69", 36, "map.unr", a.get()}, {{"000000_tune.mod", o0 + 7, music},
+                                                          {"000001_boom.wav", o1 + 8, sound},
+                                                          {"000002_notes.txt", o2 + 10, text},
+                                                          {"000003_Thing.mod", o3, thing},
+                                                          {"000004_notes.Thing", 0, {}}}),
+      Row({"object package 128", 36, "sounds.uax", b.get()},
+          {{"000000_hit.ogg", p0 + 23, ogg}, {"000001_Object.None", p1, object}}),
+  };
+}
+
+TEST(ObjectPackage, RefusesWhatTheTablesCannotName) {
+  const SampleTable rows = PackageSamples();
+  const auto with = [&](size_t row, size_t at, uint32_t v) {
+    return ArchiveBuilder().bytes(rows[row].bytes).patch32(at, v).get();
+  };
+  const uint32_t exports = ByteView(rows[1].bytes).u32le(24);
+  ExpectRefused({{"name index outside", 36, with(0, 12, 8)},
+                 {"class of a missing import", 36, with(0, 28, 2)},
+                 {"export table past the end", 36, with(0, 24, 0xFFFF0000)},
+                 {"sound header larger than its object", 36, with(1, exports + 20, 22)}});
+}
+
+}  // namespace
+}  // namespace cairn::test

@@ -1,4 +1,5 @@
-// Samples and refusals of the object package (36).
+// Samples and refusals of the object package (36), the reversed-name
+// directory (23) and the rebased header list (76).
 #include <gtest/gtest.h>
 
 #include "samples.h"
@@ -57,6 +58,53 @@ CAIRN_SAMPLES(PackageSamples) {
       Row({"object package 128", 36, "sounds.uax", b.get()},
           {{"000000_hit.ogg", p0 + 23, ogg}, {"000001_Object.None", p1, object}}),
   };
+}
+
+Bytes Reversed(std::string_view s) {
+  return Bytes(s.rbegin(), s.rend());
+}
+
+CAIRN_SAMPLES(ReworkedDirectorySamples) {
+  const Bytes readme = Pattern(12, 1), boom = Pattern(20, 2), theme = Pattern(9, 3);
+  // Records: size, order key; names back to front, each followed by 2 bytes
+  // of no name; folders replace each other. The data follows the keys.
+  ArchiveBuilder m;
+  m.u32(4).text("MASSIVE PAKFILE V 4.0\r\n").fill(5).padTo(76).u32(3).fill(12);
+  m.u32(12).u32(30).fill(8).u32(20).u32(10).fill(8).u32(9).u32(20).fill(8).u16(0);
+  for (const char* n : {"readme.txt", "sounds", "boom.wav", "music", "theme.ogg"})
+    m.bytes(Reversed(n)).u8(0).u16(0xBEEF);
+  const uint32_t s = m.patch32(84, m.size()).bytes(boom).bytes(theme).bytes(readme).size() - 41;
+  // Stored offsets from 5000 and sizes 100 over the inflated ones; the data
+  // starts 20 bytes before the first window that is no record.
+  const Bytes one = Pattern(300, 11), two = Pattern(40, 12);
+  const Bytes z1 = Compress(one, 0), z2 = Compress(two);
+  const auto n1 = static_cast<uint32_t>(z1.size()), n2 = static_cast<uint32_t>(z2.size());
+  ArchiveBuilder pk;
+  pk.text("PK").u8(4).u8(0).fill(16).u32(~(100u + 64)).padTo(64);
+  pk.u32(5000).u32(0).u32(400).fill(20).text("first.bin").u8(0).u8(0).fill(20);
+  pk.u32(5000 + n1).u32(0).u32(140).fill(20).text("dir/second.dat").u8(0).u8(0);
+  const uint32_t e = pk.size();
+  return {
+      Row({"MASSIVE PAKFILE", 23, "data.pak", m.get()}, {{"sounds\\boom.wav", s, boom},
+                                                         {"music\\theme.ogg", s + 20, theme},
+                                                         {"readme.txt", s + 29, readme}}),
+      {"PK header list",
+       76,
+       "game.pk",
+       pk.bytes(z1).bytes(z2).get(),
+       {{"first.bin", e, 300, n1, 0, 0}, {"dir\\second.dat", e + n1, 40, n2, 0, 0}},
+       {one, two}},
+  };
+}
+
+TEST(ReworkedDirectories, RefuseWhatTheirDirectoryCannotHold) {
+  const Bytes m = ReworkedDirectorySamples()[0].bytes;
+  const auto with = [&](size_t at, uint32_t v) {
+    return ArchiveBuilder().bytes(m).patch32(at, v).get();
+  };
+  ExpectRefused({{"data area inside the header", 23, with(84, 91)},
+                 {"records past the data area", 23, with(76, 8)},
+                 {"fewer names than records", 23, with(76, 4)}});
 }
 
 TEST(ObjectPackage, RefusesWhatTheTablesCannotName) {

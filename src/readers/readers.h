@@ -99,6 +99,10 @@ void SingleStreamReader(ReaderContext& c, unsigned row);
 // The object package with name, export and import tables (object_package.cpp).
 void ObjectPackageReader(ReaderContext& c, unsigned row);
 
+// Directories reworked after reading (reversed_names.cpp).
+void MassivePakReader(ReaderContext& c, unsigned row);  // "MASSIVE PAKFILE V 4.0"
+void HeaderListReader(ReaderContext& c, unsigned row);  // "PK" header list
+
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);

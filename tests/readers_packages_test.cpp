@@ -1,7 +1,9 @@
 // Samples and refusals of the object package (36), the reversed-name
-// directory (23) and the rebased header list (76).
+// directory (23), the rebased header list (76) and the enciphered record
+// list (75).
 #include <gtest/gtest.h>
 
+#include "readers/readers.h"
 #include "samples.h"
 
 namespace cairn::test {
@@ -95,6 +97,45 @@ CAIRN_SAMPLES(ReworkedDirectorySamples) {
        {{"first.bin", e, 300, n1, 0, 0}, {"dir\\second.dat", e + n1, 40, n2, 0, 0}},
        {one, two}},
   };
+}
+
+// An "ISD0" list whose key is 34 12 68 24 DF 9B 57 13: bytes 0 and 1 are
+// what the search finds, 2 and 3 the header's at 6, 4 to 7 the first record's
+// bytes 4 to 7 (which decipher to the key constant).
+Bytes Isd0(const std::vector<std::tuple<std::string, uint32_t, Bytes>>& records) {
+  const uint8_t key[8] = {0x34, 0x12, 0x68, 0x24, 0xDF, 0x9B, 0x57, 0x13};
+  const auto n = static_cast<uint32_t>(records.size());
+  ArchiveBuilder b;
+  b.text("ISD0").u32(0x24680000 | (n ^ 0x1234)).u32(0).u32((n * 28) ^ 0x24681234).u32(0);
+  for (const auto& [name, size, data] : records) {
+    ArchiveBuilder r;
+    r.u32(32 + name.size() + data.size()).u32(kIsd0KeyConstant).fill(8).u32(size).u32(0);
+    Bytes head = r.u16(name.size()).fill(6).text(name).get();
+    for (size_t j = 0; j < head.size(); ++j) head[j] ^= key[j % 8];
+    b.bytes(head).bytes(data);
+  }
+  return b.padTo(104).get();
+}
+
+CAIRN_SAMPLES(EncipheredRecordSamples) {
+  // Each entry's data is a chain of blocks: L (bytes + 1), 3 bytes, the bytes.
+  const Bytes one = ArchiveBuilder().u16(4).fill(3).text("abc").u16(3).fill(3).text("de").get();
+  const Bytes two = ArchiveBuilder().u16(5).fill(3).text("fghi").get();
+  return {{"ISD0",
+           75,
+           "voice.isd",
+           Isd0({{"intro.txt", 7, one}, {"sub/level.dat", 5, two}}),
+           {{"intro.txt", 61, 7, 7, 0, 0}, {"sub\\level.dat", 121, 5, 5, 0, 0}},
+           {Text("abcde"), Text("fghi")}}};
+}
+
+TEST(EncipheredRecords, NameLengthsAndRecordLengthsAreBounded) {
+  EXPECT_EQ(OpenBytesAs(75, Isd0({{std::string(259, 'n'), 0, {}}}))->listing(),
+            (std::vector<Listed>{{std::string(259, 'n'), 311, 0, 0, 0, 0}}));
+  Bytes looped = Isd0({{"a", 0, {}}, {"b", 0, {}}});
+  looped[20] ^= 33;  // the first record's length deciphers to 0
+  ExpectRefused({{"name of 260", 75, Isd0({{std::string(260, 'n'), 0, {}}})},
+                 {"record of no length", 75, looped}});
 }
 
 TEST(ReworkedDirectories, RefuseWhatTheirDirectoryCannotHold) {

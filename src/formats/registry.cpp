@@ -88,7 +88,7 @@ constexpr std::array<FormatInfo, kFormatCount> kFormats = {{
     {72, "tex2", "\"TEX\" texture lists", nullptr, 0, TgaStored},
     {73, "xcr", "\"xcr File 1.00\" archive", FieldTableReader, 6, RawCopy},
     {74, "lp1c", "\"LP1C\" archive", nullptr, 0, RawCopy},
-    {75, "isd0", "\"ISD0\" enciphered record list", nullptr, 0, BlockJoin},
+    {75, "isd0", "\"ISD0\" enciphered record list (key constant unknown: a stand-in is used)", EncipheredRecordReader, 0, BlockJoin},
     {76, "pklist", "\"PK\" header list", HeaderListReader, 0, Inflate},
     {77, "lgr", "23-byte-header file chain", nullptr, 0, RawCopy},
     {78, "img", "named palette picture", nullptr, 0, TgaLeadingPalette},

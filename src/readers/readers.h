@@ -103,6 +103,11 @@ void ObjectPackageReader(ReaderContext& c, unsigned row);
 void MassivePakReader(ReaderContext& c, unsigned row);  // "MASSIVE PAKFILE V 4.0"
 void HeaderListReader(ReaderContext& c, unsigned row);  // "PK" header list
 
+// The "ISD0" record list (enciphered_records.cpp). Its key takes in a 32-bit
+// constant that is not known; this stand-in takes its place until it is.
+inline constexpr uint32_t kIsd0KeyConstant = 0x5EED15D0;
+void EncipheredRecordReader(ReaderContext& c, unsigned row);
+
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);

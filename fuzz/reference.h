@@ -15,8 +15,6 @@ namespace cairn::fuzz {
 using Bytes = std::vector<uint8_t>;
 
 inline std::optional<Bytes> ReferenceJdlz(const uint8_t* c, size_t n, uint32_t size) {
-  // No stream of n bytes produces more than this; the caller writes the rest
-  // as zeros.
   const uint64_t tokenBytes = n < 2 ? 0 : n - 2;
   if (n < 2 && size > 0) return std::nullopt;
   size = static_cast<uint32_t>(std::min<uint64_t>(size, tokenBytes / 2 * 4098 + tokenBytes % 2));

@@ -64,8 +64,7 @@ TEST(Jdlz, StreamsDecodeExactlyOrAreRefused) {
       // Bytes a short stream does not produce are zero, also after a block copy.
       {Cat({{0x00, 0x01}, Slice(lits, 0, 8), {0x01, 0x07, 0x02}}), 16,
        Cat({Slice(lits, 0, 8), Slice(lits, 0, 5), Bytes(3, 0)})},
-      // Two token bytes make at most 4098 bytes, the decoder's whole buffer
-      // (the method writes the rest as zeros); a lone flag byte nothing.
+      // Two token bytes make at most 4098 bytes; a lone flag byte nothing.
       {{0x00, 0x00, 'a', 'b'}, 4099, Cat({Text("ab"), Bytes(4096, 0)})},
       {{0x00}, 1, kRefused},
       // A match before the start (long form, distance 17); after a literal, a
@@ -87,8 +86,7 @@ TEST(Rle, StreamsDecodeExactlyOrAreRefused) {
       // Bytes the runs do not reach are zero, also after a block copy.
       {Cat({{0x81, 'a'}, Bytes(18, 0x80)}), 4, Bytes({'a', 0, 0, 0})},
       // A run past the output or past the coded bytes; a repeat without its
-      // byte; more than 127 bytes per two coded bytes, 127 being the most,
-      // end the buffer there.
+      // byte; more than 127 bytes per two coded bytes, 127 being the most.
       {{0x05, 'a'}, 4, kRefused},
       {{0x85, 'a', 'b'}, 5, kRefused},
       {{0x81, 'a', 0x03}, 4, kRefused},

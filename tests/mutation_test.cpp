@@ -25,7 +25,7 @@ struct Tally {
 };
 
 // Opens `bytes` changed at `changes` positions that `where` picks, and
-// extracts its first 64 entries of at most 16 MiB.
+// extracts its first 64 entries.
 template <typename Where>
 void Mutant(const Sample& s, Bytes bytes, size_t changes, Where where, std::mt19937& random,
             Tally& t) {
@@ -38,7 +38,7 @@ void Mutant(const Sample& s, Bytes bytes, size_t changes, Where where, std::mt19
   ASSERT_TRUE(r == kOk || r == kBadData || r == kUnknownFormat) << r;
   ++(r == kOk ? t.opened : t.refused);
   for (size_t i = 0; r == kOk && i < o->session.entries.size() && i < 64; ++i) {
-    // A damaged size may rightly ask a short coded stream for gigabytes of zeros.
+    // A damaged size may rightly ask a short stream for gigabytes of zeros.
     if (o->session.entries[i].UnpackedSize > (16u << 20)) continue;
     Bytes out;
     const int e = o->extract(i, out);  // checks that a failure leaves no file

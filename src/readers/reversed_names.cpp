@@ -31,8 +31,8 @@ void MassivePakReader(ReaderContext& c, unsigned) {
   if (dataStart < 92) throw BadData("data area inside the header");
   const std::vector<uint8_t> block = ReadBlock(c, 92, dataStart - 92);
   const ByteView directory(block);
+  directory.need(0, uint64_t{count} * 16);  // the records; a count of 0 needs no names
   uint64_t at = uint64_t{count} * 16 + 2;
-  directory.need(0, at);
   std::string folder;
   for (uint32_t i = 0; i < count;) {
     const std::string_view stored = directory.cstr(at, kMaxNameLength + 1);

@@ -4,6 +4,7 @@
 // every input. Empty optional: the data is refused.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <optional>
@@ -15,7 +16,8 @@ using Bytes = std::vector<uint8_t>;
 
 inline std::optional<Bytes> ReferenceJdlz(const uint8_t* c, size_t n, uint32_t size) {
   const uint64_t tokenBytes = n < 2 ? 0 : n - 2;
-  if (size > tokenBytes / 2 * 4098 + tokenBytes % 2) return std::nullopt;
+  if (n < 2 && size > 0) return std::nullopt;
+  size = static_cast<uint32_t>(std::min<uint64_t>(size, tokenBytes / 2 * 4098 + tokenBytes % 2));
   Bytes out(size, 0);
   if (n < 2) return out;
   uint32_t f1 = c[0] | 0x100u, f2 = c[1] | 0x100u;
@@ -59,7 +61,7 @@ inline std::optional<Bytes> ReferenceJdlz(const uint8_t* c, size_t n, uint32_t s
 }
 
 inline std::optional<Bytes> ReferenceRle(const uint8_t* c, size_t n, uint32_t size) {
-  if (size > n / 2 * uint64_t{127}) return std::nullopt;
+  size = static_cast<uint32_t>(std::min<uint64_t>(size, n / 2 * uint64_t{127}));
   Bytes out(size, 0);
   size_t i = 0, o = 0;
   while (i < n) {

@@ -42,6 +42,8 @@ void Mutant(Sample s, size_t changes, size_t tail, std::mt19937& random, Tally& 
   ASSERT_TRUE(r == kOk || r == kBadData || r == kUnknownFormat) << r;
   ++(r == kOk ? t.opened : t.refused);
   for (size_t i = 0; r == kOk && i < o->session.entries.size() && i < 64; ++i) {
+    // A damaged size may rightly ask a short stream for gigabytes of zeros.
+    if (o->session.entries[i].UnpackedSize > (16u << 20)) continue;
     Bytes out;
     const int e = o->extract(i, out);  // checks that a failure leaves no file
     ASSERT_TRUE(e == kOk || e == kBadData) << e;

@@ -1,6 +1,7 @@
 // The extraction methods over the in-memory decoders, and the block join.
 // A decoded entry is built once in memory and written with one write; the
 // stored bytes are released before that.
+#include <algorithm>
 #include <vector>
 
 #include "codecs/codecs.h"
@@ -12,10 +13,21 @@ namespace {
 
 using DecodeFn = std::vector<uint8_t> (*)(ByteView coded, uint32_t unpackedSize);
 
+// The output is UnpackedSize bytes even where the coded bytes cannot produce
+// that many: the rest is zeros, written a chunk at a time rather than from a
+// buffer of the size the directory claims. Each chunk asks the host whether
+// to go on (a report of no bytes: the figure stays PackedSize).
 void DecodeEntry(ExtractionFrame& f, DecodeFn decode) {
-  std::vector<uint8_t> out =
+  const std::vector<uint8_t> out =
       decode(ReadStored(f, f.entry.Offset, f.entry.PackedSize), f.entry.UnpackedSize);
   f.Write(out);
+  const std::vector<uint8_t> zeros(std::min<size_t>(f.entry.UnpackedSize - out.size(), 1048576));
+  for (size_t left = f.entry.UnpackedSize - out.size(); left > 0;) {
+    const size_t n = std::min(left, zeros.size());
+    f.Write(ByteView(zeros.data(), n));
+    f.Report(0);
+    left -= n;
+  }
 }
 
 }  // namespace

@@ -12,13 +12,16 @@
 namespace cairn {
 
 // A "JDLZ" coded stream (the two flag bytes first, no tagged header) decoded
-// to exactly `unpackedSize` bytes. Bytes the stream ends without producing
-// are zero.
+// to `unpackedSize` bytes, or to as many as the coded bytes can produce when
+// that is fewer: the bytes beyond, which no stream of this length reaches,
+// are the caller's to write as zeros. Bytes the stream ends without
+// producing are zero.
 std::vector<uint8_t> JdlzDecode(ByteView coded, uint32_t unpackedSize);
 
 // A run-length code (control byte: bit 7 set, that many literal bytes follow;
-// clear, the next byte repeats that many times) decoded to exactly
-// `unpackedSize` bytes. Bytes the runs do not reach are zero.
+// clear, the next byte repeats that many times) decoded to `unpackedSize`
+// bytes, or to as many as the coded bytes can produce, like JdlzDecode. Bytes
+// the runs do not reach are zero.
 std::vector<uint8_t> RleDecode(ByteView coded, uint32_t unpackedSize);
 
 // An opcode LZ stream (each opcode gives literals, then a copy) decoded to

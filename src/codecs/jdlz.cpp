@@ -21,11 +21,12 @@ constexpr uint64_t kLongestMatch = 4098;
 
 std::vector<uint8_t> JdlzDecode(ByteView coded, uint32_t unpackedSize) {
   // After the two flag bytes, no token yields more than a two-byte match of
-  // 4098 bytes.
+  // 4098 bytes: the output buffer holds no more than that, and a stream that
+  // fills it has used up its coded bytes.
   const uint64_t tokenBytes = coded.size() < 2 ? 0 : coded.size() - 2;
-  if (unpackedSize > tokenBytes / 2 * kLongestMatch + tokenBytes % 2)
-    throw BadData("more output than the coded bytes can hold");
-  const size_t end = unpackedSize;
+  const size_t end =
+      std::min<uint64_t>(unpackedSize, tokenBytes / 2 * kLongestMatch + tokenBytes % 2);
+  if (coded.size() < 2 && unpackedSize > 0) throw BadData("no flag bytes");
   std::vector<uint8_t> out(end + kCopySlack);
   uint8_t* const o0 = out.data();
   size_t o = 0;

@@ -2,6 +2,7 @@
 // seven bits n are its length: with bit 7 set, n literal bytes follow; with
 // bit 7 clear, one byte follows and repeats n times. A run of length 0 still
 // takes its byte (0x00) or nothing more (0x80).
+#include <algorithm>
 #include <cstring>
 
 #include "codecs/codecs.h"
@@ -10,10 +11,9 @@
 namespace cairn {
 
 std::vector<uint8_t> RleDecode(ByteView coded, uint32_t unpackedSize) {
-  // The most two coded bytes can say is a run of 127.
-  if (unpackedSize > uint64_t{coded.size() / 2} * 127)
-    throw BadData("more output than the runs can hold");
-  const size_t end = unpackedSize;
+  // The most two coded bytes can say is a run of 127: the output buffer holds
+  // no more than that.
+  const size_t end = std::min<uint64_t>(unpackedSize, uint64_t{coded.size() / 2} * 127);
   std::vector<uint8_t> out(end + kCopySlack);
   uint8_t* const o0 = out.data();
   size_t o = 0;

@@ -68,14 +68,13 @@ void CopyChunks(ExtractionFrame& f, uint32_t offset, uint32_t size, Transform t,
 }
 
 void CopyComposite(ExtractionFrame& f) {
-  const uint8_t flag = f.entry.Flag;
-  if (flag - 2u >= kCompositePartTable.size()) throw BadData("no such track");
-  const int first = kCompositePartTable[flag - 2];
-  const int second = first + (flag == 62 ? 1 : -1);
-  const int third = second + (flag == 39 || flag == 92 || flag == 140 ? 2 : 4);
-  for (int index : {first, second, third}) {
-    if (index < 0 || static_cast<size_t>(index) >= f.session.entries.size())
-      throw BadData("track part outside the table");
+  const std::array<int, 3> parts = CompositeParts(f.entry.Flag);
+  if (parts[0] < 0) throw BadData("no such track");
+  for (int index : parts) {
+    // A part is a plain item of the bank, never another track.
+    if (index < 0 || static_cast<size_t>(index) >= f.session.entries.size() ||
+        f.session.entries[static_cast<size_t>(index)].Flag != 1)
+      throw BadData("track part outside the items");
     const ArchiveEntry& part = f.session.entries[static_cast<size_t>(index)];
     CopyChunks(f, part.Offset, part.PackedSize, Transform::PositionKey, 0);
   }
@@ -162,6 +161,14 @@ const uint32_t kPositionKeyTable[16] = {
     CAIRN_KEY_WORD(12), CAIRN_KEY_WORD(13), CAIRN_KEY_WORD(14), CAIRN_KEY_WORD(15),
 #undef CAIRN_KEY_WORD
 };
+
+std::array<int, 3> CompositeParts(uint8_t flag) {
+  if (flag < 2 || flag - 2u >= kCompositePartTable.size()) return {-1, -1, -1};
+  const int first = kCompositePartTable[flag - 2];
+  const int second = first + (flag == 62 ? 1 : -1);
+  const int third = second + (flag == 39 || flag == 92 || flag == 140 ? 2 : 4);
+  return {first, second, third};
+}
 
 void ExtractionFrame::Report(uint32_t bytes) const {
   if (session.progress && session.progress(destName, bytes) == 0) throw Aborted{};

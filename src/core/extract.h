@@ -2,6 +2,7 @@
 // its format, ending in finish (0), error exit (12) or abort (21).
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <string>
 
@@ -40,6 +41,10 @@ void CopyStored(ExtractionFrame& f, uint32_t offset, uint32_t size);
 // The default method: the entry's stored bytes, with the per-format
 // transforms, composite entries and ZIP header repairs.
 void RawCopy(ExtractionFrame& f);
+
+// The entries a catalogue track of the station bank (FormatId 65, Flag 2 and
+// up) is joined from, in order; -1 for a Flag that names no track.
+std::array<int, 3> CompositeParts(uint8_t flag);
 
 // The 16 key words of the two sound-bank formats, applied by file position
 // modulo 16.

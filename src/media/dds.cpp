@@ -118,6 +118,7 @@ void DdsMaybeCoded(ExtractionFrame& f) {
     throw BadData("decoded size beyond what the coded bytes can give");
   const std::vector<uint8_t> coded = ReadStored(f, uint64_t{e.Offset} + 16, blockSize - 16);
   std::vector<uint8_t> texture = JdlzDecode(coded, decodedSize);
+  texture.resize(decodedSize);  // what the coded bytes cannot reach is zero
   if ((e.Flag & 0x0F) == 1) {
     if (texture.size() < 1024) throw BadData("no palette behind the pixels");
     std::rotate(texture.begin(), texture.end() - 1024, texture.end());

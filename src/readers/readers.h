@@ -144,5 +144,20 @@ void TextureListReader(ReaderContext& c, unsigned row);
 void FolderTableReader(ReaderContext& c, unsigned row);
 void RezMgrReader(ReaderContext& c, unsigned row);
 void ItemTreeReader(ReaderContext& c, unsigned row);
+// The object package with name, export and import tables (object_package.cpp).
+void ObjectPackageReader(ReaderContext& c, unsigned row);
+
+// Directories reworked after reading (reversed_names.cpp).
+void MassivePakReader(ReaderContext& c, unsigned row);  // "MASSIVE PAKFILE V 4.0"
+void HeaderListReader(ReaderContext& c, unsigned row);  // "PK" header list
+
+// The "ISD0" record list (enciphered_records.cpp). Its key takes in a 32-bit
+// constant that is not known; this stand-in takes its place until it is.
+inline constexpr uint32_t kIsd0KeyConstant = 0x5EED15D0;
+void EncipheredRecordReader(ReaderContext& c, unsigned row);
+
+// Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
+// the banks with a second length (66).
+void SoundBankReader(ReaderContext& c, unsigned row);
 
 }  // namespace cairn

@@ -156,6 +156,13 @@ void HeaderListReader(ReaderContext& c, unsigned row);  // "PK" header list
 inline constexpr uint32_t kIsd0KeyConstant = 0x5EED15D0;
 void EncipheredRecordReader(ReaderContext& c, unsigned row);
 
+// Sequential name directories and item chains (sequential_names.cpp): row 0
+// the 23-byte-header chain (77), 1 zero-terminated names (96), 2 the name
+// table (103), 3 inline names (107), 4 20-byte records (113), 5 the 16-byte
+// header chain (117), 6 space-terminated names (119), 7 length-prefixed names
+// (144), 8 the big-endian directory (16, 132).
+void SequentialNameReader(ReaderContext& c, unsigned row);
+
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);

@@ -33,13 +33,6 @@ void SizesFromOffsets(ReaderContext& c, uint32_t end) {
   }
 }
 
-void AssignSequentialOffsets(ReaderContext& c, uint32_t start) {
-  for (ArchiveEntry& e : c.entries) {
-    e.Offset = start;
-    start += e.PackedSize;
-  }
-}
-
 void CloseArchiveSession(ArchiveSession& s) {
   s.entries.clear();
   s.entries.shrink_to_fit();

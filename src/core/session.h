@@ -81,9 +81,6 @@ std::vector<uint8_t> ReadBlock(const ReaderContext& c, uint64_t position, uint64
 // up to `end` (the file size when 0). Offsets must not go backwards.
 void SizesFromOffsets(ReaderContext& c, uint32_t end = 0);
 
-// Lays the entries back to back from `start`, in table order.
-void AssignSequentialOffsets(ReaderContext& c, uint32_t start);
-
 // Ends the session: releases the table and closes the archive.
 void CloseArchiveSession(ArchiveSession& s);
 

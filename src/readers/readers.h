@@ -163,6 +163,14 @@ void EncipheredRecordReader(ReaderContext& c, unsigned row);
 // (144), 8 the big-endian directory (16, 132).
 void SequentialNameReader(ReaderContext& c, unsigned row);
 
+// Block streams, offset tables and tagged chunk files (block_streams.cpp):
+// block streams row 0 ".frame", 1 ".sequence" with a 12-byte header, 2
+// ".sequence" without; tagged chunks row 0 "TGL", 1 "KPS".
+void BlockStreamReader(ReaderContext& c, unsigned row);
+void NumberedOffsetTableReader(ReaderContext& c, unsigned row);
+void TaggedChunkReader(ReaderContext& c, unsigned row);
+void ChunkOffsetTableReader(ReaderContext& c, unsigned row);
+
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);

@@ -13,100 +13,90 @@ using B = ArchiveBuilder;
 const std::string kName24 = "abcdefghijklmnopqrstuvwx";
 const Bytes kPalette3(kBuiltInPalette3.begin(), kBuiltInPalette3.end());
 
-// Rows of one grey: the BMP file holds the stored pixels as they are.
 Sample Named(FormatId id, uint32_t w, uint32_t v, uint32_t height, const std::string& name) {
+  const uint32_t size = 512 * height + 1078;
   B b;
   for (uint32_t x : {22u, 0x49C | w, v, 1u, 4u, v, 1u, 21u, 0x474 | w, v, 1u, 0x45C | w, v, 8u})
     b.u32(x);
-  Bytes palette = Pattern(1024, 3), pixels(512 * height, 0x5A);
-  b.padTo(60).name(name, 24).padTo(140).bytes(palette).padTo(1168).bytes(pixels);
-  SwapRedBlue(palette);
-  const uint32_t size = 512 * height + 1078;
+  const Bytes pixels(512 * height, 0x5A),
+      bmp = Cat({BmpHeader(size, 512, height, 8), Bytes(1024), pixels});
+  b.padTo(60).name(name, 24).padTo(1168).bytes(pixels);  // the palette at 140 is black
   return Entries({"named palette image", id, "sky.pic", b.get()},
-                 {{{name + ".bmp", 0, size, size, 0, 0},
-                   Cat({BmpHeader(size, 512, height, 8), palette, pixels})}});
-}
-
-B Head(uint8_t type, uint32_t w, uint32_t h, uint32_t palette, uint8_t bits) {
-  return std::move(B().u8(type).u32(w).u32(h).fill(12).u32(palette).u8(bits).fill(3));
+                 {{{name + ".bmp", 0, size, size, 0, 0}, bmp}});
 }
 
 // `lead` bytes that start no picture, a picture with its own 16-bit palette,
 // 8 zero bytes, an 8-bit picture of odd width and a 16-bit one.
 Sample Sequence(FormatId id, const std::string& file, uint32_t lead) {
-  const Bytes own = Cat({{0, 1, 2, 255}, Bytes(8), Pattern(512, 5)}), odd = Pattern(3, 4);
-  const Bytes deep = Pattern(18, 6);
+  auto Head = [](uint8_t type, uint32_t w, uint32_t h, uint32_t palette, uint8_t bits) {
+    return std::move(B().u8(type).u32(w).u32(h).fill(12).u32(palette).u8(bits).fill(3));
+  };
+  const Bytes own = Cat({{0, 1, 2, 255}, Bytes(8), Pattern(512, 5)}), odd = Pattern(3),
+              deep = Pattern(18);
   B b = B().fill(lead, 7).bytes(Head(1, 2, 2, 1, 8).bytes(own).fill(8).get());
   b.bytes(Head(2, 3, 1, 0, 8).bytes(odd).get()).bytes(Head(2, 3, 3, 0, 16).bytes(deep).get());
   const Bytes& a = b.get();
+  const Bytes t0 = Cat({TgaHeader(0x20002, 16, 0x20), Slice(own, 12, 6), Slice(own, 522, 2)});
+  const Bytes b1 = Cat({BmpHeader(1082, 3, 1, 8), kPalette3, odd, {0}});
   const std::string n = file + ".00000", tga = "_TO_TGA_\\" + n;
   return Entries({"image sequence", id, file, a},
                  {{{n + "0", lead, 553, 553, 0, 0}, Slice(a, lead, 553)},
-                  {{tga + "0.tga", lead + 29, 26, 524, 0x20002, 1},
-                   Cat({TgaHeader(0x20002, 16, 0x20), Slice(own, 12, 6), Slice(own, 522, 2)})},
+                  {{tga + "0.tga", lead + 29, 26, 524, 0x20002, 1}, t0},
                   {{n + "1", lead + 561, 32, 32, 0, 0}, Slice(a, lead + 561, 32)},
-                  {{"_TO_BMP_\\" + n + "1.bmp", lead + 590, 1082, 3, 0, 2},
-                   Cat({BmpHeader(1082, 3, 1, 8), kPalette3, odd, {0}})},
+                  {{"_TO_BMP_\\" + n + "1.bmp", lead + 590, 1082, 3, 0, 2}, b1},
                   {{n + "2", lead + 593, 47, 47, 0, 0}, Slice(a, lead + 593, 47)},
                   {{tga + "2.tga", lead + 622, 36, 18, 0x30003, 3},
                    Cat({TgaHeader(0x30003, 16, 0x20), deep})}});
 }
 
-// The texture and format sections of a palette texture and a DXT1 one, each
-// section followed by 8 bytes.
+// The texture and format sections of a palette texture, 8 bytes after each.
 B& Tables(B& b) {
-  b.u32(264).fill(12).name("palette", 24).fill(12).u32(1024).fill(4).u32(16).fill(8).u32(0x20004);
-  b.fill(64).name(kName24, 24).fill(12).u32(1040).fill(4).u32(8).fill(8).u32(0x10002).fill(6);
-  return b.u8(1).fill(65).u32(88).fill(20).u32(41).fill(28).text("DXT1").fill(36);
+  b.u32(140).fill(12).name(kName24, 24).fill(12).u32(1024).fill(4).u32(16).fill(8).u32(0x20004);
+  return b.fill(6).u8(1).fill(65).u32(56).fill(20).u32(41).fill(36);
 }
 
-// A palette texture at `at`, `packed` bytes long, and a DXT1 one at 1944.
-Sample Bundle(FormatId id, const Bytes& a, uint32_t at, uint32_t packed, uint32_t second) {
+Sample Bundle(FormatId id, const Bytes& a, uint32_t at, uint32_t packed) {
+  const Bytes dds = Cat({DdsHeader(id, 0x11, 0x20004), Slice(a, at, packed)});
   return Entries({"texture bundle", id, "ui.bun", a},
-                 {{{"palette.000000.dds", at, 1232, packed, 0x20004, 1},
-                   Cat({DdsHeader(id, 1, 0x20004), Slice(a, at, packed)})},
-                  {{kName24 + ".000001.dds", second, 136, 8, 0x10002, 0x13},
-                   Cat({DdsHeader(id, 0x13, 0x10002), Slice(a, second, 8)})}});
+                 {{{kName24 + ".000000.dds", at, 1232, packed, 0x20004, 0x11}, dds}});
 }
 
-// The leading block is 104 bytes; the palette texture is stored 1024 bytes
-// into the data, which begin at 904.
 Bytes Leading(size_t labelAt, std::string_view label) {
   B b = B().text("BNDL").padTo(12).u32(104).padTo(labelAt).text(label).padTo(272);
-  return Tables(b).u32(4).padTo(904).bytes(Pattern(1048)).get();
+  return Tables(b).u32(4).padTo(748).bytes(Pattern(1040)).get();
 }
 
 CAIRN_SAMPLES(PictureSamples) {
   const Bytes indices = Pattern(8, 2), rgb = Pattern(768, 5), rgb24 = Pattern(96, 8);
-  const Bytes texture = Pattern(1000);
-  // The placement section is 59 bytes: two whole records.
-  B three = B().text("BND3").padTo(36).text("CARTEXTURES").padTo(168).u32(59).u32(0).u32(608);
-  Tables(three.u32(12).fill(12).u32(624).u32(8).fill(31)).padTo(608).bytes(Pattern(24));
-  Sample packed =
-      Entries({"packed texture", 120, "car.tex", Cat({B().u32(1000).get(), Compress(texture)})},
-              {{{"_TO_TGA_\\car.TEX24.tga", 4, 393234, 296, 512 | 256 << 16, 2},
-                Cat({TgaHeader(512 | 256 << 16, 24, 0x20), texture})},
-               {{"car.TEX24", 4, 1000, 296, 0, 1}, texture}});
-  // Recognition wants a stream that begins 78 9C EC BD: many blocks, every code used.
+  const Bytes logo = Cat({B().u32(8).u32(4).u32(2).get(), indices, rgb});
+  const Bytes photo = Cat({B().u32(96).u32(8).u32(4).get(), rgb24}), texture = Pattern(1000);
+  // The placement section is 39 bytes: one whole record.
+  B three = B().text("BND3").padTo(36).text("CARTEXTURES").padTo(168).u32(39).u32(0).u32(432);
+  Tables(three.u32(12).fill(31)).padTo(432).bytes(Pattern(12));
+  const uint32_t wide = 512 | 256 << 16;
+  const Bytes tex = Cat({B().u32(1000).get(), Compress(texture)});
+  Sample packed = Entries({"packed texture", 120, "car.tex", tex},
+                          {{{"_TO_TGA_\\car.TEX24.tga", 4, 393234, 296, wide, 2},
+                            Cat({TgaHeader(wide, 24, 0x20), texture})},
+                           {{"car.TEX24", 4, 1000, 296, 0, 1}, texture}});
+  // Recognition wants the stream to begin 78 9C EC BD, as only long ones do.
   packed.recognised = false;
   return {
       Named(99, 0x40000, 0x1003FFFF, 512, "sky"),
       Named(100, 0x20000, 0x0C02FFFF, 256, kName24),
-      Entries({"headerless 8-bit picture", 151, "logo.raw",
-               B().u32(8).u32(4).u32(2).bytes(indices).bytes(rgb).get()},
+      Entries({"headerless 8-bit picture", 151, "logo.raw", logo},
               {{{"logo.tga", 12, 794, 8, 0x20004, 24},
                 Cat({TgaColourMappedStart(0x20004, 8, rgb, 256), indices})}}),
       Entries(
-          {"headerless 24-bit picture", 152, "photo.raw",
-           B().u32(96).u32(8).u32(4).bytes(rgb24).get()},
+          {"headerless 24-bit picture", 152, "photo.raw", photo},
           {{{"photo.tga", 12, 114, 96, 0x40008, 24}, Cat({TgaHeader(0x40008, 24, 0x20), rgb24})}}),
       Sequence(135, "anim.r8", 0),
       Sequence(137, "anim.r16", 0),
       Sequence(136, "anim.r8", 8),
       Sequence(138, "anim.r16", 8),
-      Bundle(123, three.get(), 608, 12, 624),
-      Bundle(124, Leading(36, "ROAD_SEGMENT"), 904, 1040, 1944),
-      Bundle(157, Leading(84, "FRONTEND"), 1928, 16, 1944),
+      Bundle(123, three.get(), 432, 12),
+      Bundle(124, Leading(36, "ROAD_SEGMENT"), 748, 1040),
+      Bundle(157, Leading(84, "FRONTEND"), 1772, 16),
       packed,
   };
 }
@@ -114,9 +104,9 @@ CAIRN_SAMPLES(PictureSamples) {
 TEST(PictureReaders, RefuseWhatCannotHoldTogether) {
   const Bytes palettes = Leading(36, "ROAD_SEGMENT");
   ExpectRefused({
-      {"sequence picture past 4 GiB", 135, Head(2, 65536, 65536, 0, 8).padTo(104).get()},
+      {"sequence picture past 4 GiB", 135, With(Sequence(135, "a.r8", 0), 1, 0x80000000)},
       {"headerless picture past 4 GiB", 151, B().u32(0).u32(65536).u32(65536).padTo(104).get()},
-      {"format records beyond their section", 124, B().bytes(palettes).patch32(544, 56).get()},
+      {"format records beyond their section", 124, B().bytes(palettes).patch32(420, 24).get()},
       {"palette before the start of the file", 124, B().bytes(palettes).patch32(324, 0).get()},
   });
 }

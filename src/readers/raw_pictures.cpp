@@ -67,7 +67,7 @@ void HeaderlessImageReader(ReaderContext& c, unsigned row) {
   // Row 0: 8-bit indices, their palette listed in front of them in the TGA
   // file; row 1: 24-bit pixels.
   const uint32_t width = c.header.u32le(4), height = c.header.u32le(8);
-  const uint64_t packed = uint64_t{width} * height * (row == 0 ? 1 : 3);
+  const uint64_t packed = uint64_t{Fit32(uint64_t{width} * height)} * (row == 0 ? 1 : 3);
   const uint64_t head = row == 0 ? kTgaHeaderSize + kTgaColourMapSize : kTgaHeaderSize;
   std::string_view base = StripExtension(c.archiveFileName);
   if (base.empty()) base = c.archiveFileName;
@@ -90,7 +90,9 @@ void ImageSequenceReader(ReaderContext& c, unsigned row) {
     const uint32_t width = head.u32le(1), height = head.u32le(5);
     const uint8_t bits = head.u8(25);
     const bool ownPalette = head.u8(0) == 1 && head.u32le(21) != 0;
-    const uint64_t data = uint64_t{bits} * width * height / 8 + (ownPalette ? kOwnPalette : 0);
+    const uint64_t rowBits = uint64_t{bits} * width;
+    if (height != 0 && rowBits > UINT64_MAX / height) throw BadData("picture larger than 4 GiB");
+    const uint64_t data = rowBits * height / 8 + (ownPalette ? kOwnPalette : 0);
     const uint32_t size = Fit32(kImageHead + data);
     const std::string name = NumberedName(c.archiveFileName, number);
     const auto offset = static_cast<uint32_t>(position);  // inside the file

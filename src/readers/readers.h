@@ -171,6 +171,19 @@ void NumberedOffsetTableReader(ReaderContext& c, unsigned row);
 void TaggedChunkReader(ReaderContext& c, unsigned row);
 void ChunkOffsetTableReader(ReaderContext& c, unsigned row);
 
+// Bare pictures (raw_pictures.cpp): the named palette images (row 0 512 x
+// 512, 1 512 x 256), the headerless images (row 0 8-bit with a palette, 1
+// 24-bit) and the image sequences (row 0 pictures at the next non-zero byte,
+// 1 on an 8-byte grid).
+void NamedImageReader(ReaderContext& c, unsigned row);
+void HeaderlessImageReader(ReaderContext& c, unsigned row);
+void ImageSequenceReader(ReaderContext& c, unsigned row);
+// Textures (texture_bundles.cpp): the sectioned bundles (row 0 with three
+// sections, 1 with a leading block and palettes in front, 2 with a leading
+// block) and the packed 512 x 256 texture.
+void TextureBundleReader(ReaderContext& c, unsigned row);
+void PackedTextureReader(ReaderContext& c, unsigned row);
+
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);

@@ -95,7 +95,7 @@ void ReadH4r(ReaderContext& c) {
 
 // The name that starts at `at` and ends at a newline within 260 bytes.
 std::string_view NewlineName(ByteView v, uint64_t at) {
-  for (uint64_t n = 0; n <= kMaxNameLength && v.has(at, n + 1); ++n)
+  for (size_t n = 0; n <= kMaxNameLength && v.has(at, n + 1); ++n)
     if (v.u8(at + n) == '\n') return {reinterpret_cast<const char*>(v.data() + at), n};
   throw BadData("name without its newline");
 }

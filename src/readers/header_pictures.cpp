@@ -45,8 +45,10 @@ std::string BaseName(const ReaderContext& c) {
 
 struct FolderWalk {
   ReaderContext& c;
-  // A tree reads each record once, and an empty-named one once more for
-  // each folder it ends; more reads than that mean records shared or looped.
+  // A walk that succeeds reads at most fileSize / 48 named records (each
+  // folder skips what its children took, and the walk must end inside the
+  // file) and one empty-named record per folder; more reads than that mean
+  // shared or looping folders.
   uint64_t recordsLeft;
 
   // Adds the files of the folder whose records start at `position` and
@@ -80,7 +82,7 @@ struct FolderWalk {
 }  // namespace
 
 void NestedFolderReader(ReaderContext& c, unsigned) {
-  FolderWalk{c, c.fileSize / kFolderRecord + kMaxNameLength}.Walk(0, {});
+  FolderWalk{c, 2 * (c.fileSize / kFolderRecord) + 2}.Walk(0, {});
 }
 
 void CompressedDirectoryReader(ReaderContext& c, unsigned) {

@@ -10,9 +10,9 @@ rank() {
     formats) echo 3 ;; hosts/*) echo 4 ;; *) echo 9 ;;
   esac
 }
-# The uses across one layer: pictures decode through the codecs, and readers
-# add the converted copies of the conversion folders.
-allowed=" media>codecs readers>media "
+# The uses across one layer: pictures decode through the codecs, readers add
+# converted copies of pictures and sounds, and one reader recognises entries.
+allowed=" media>codecs readers>media readers>detect "
 folder() { case "$1" in hosts/*) echo "$1" | cut -d/ -f1-2 ;; *) echo "${1%%/*}" ;; esac; }
 bad=0
 while IFS= read -r file; do

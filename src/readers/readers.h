@@ -184,6 +184,27 @@ void ImageSequenceReader(ReaderContext& c, unsigned row);
 void TextureBundleReader(ReaderContext& c, unsigned row);
 void PackedTextureReader(ReaderContext& c, unsigned row);
 
+// Names chosen by content or type (content_names.cpp): the sheet archive
+// (80), 8.3 names (88), the offset-list sound bank (102), the raw picture
+// list (104), scrambled names (106), the sound bank with an ".idx" index
+// (126), the tagged chunk stream (146) and the name list (156).
+void SheetArchiveReader(ReaderContext& c, unsigned row);
+void Dir83Reader(ReaderContext& c, unsigned row);
+void OffsetSoundReader(ReaderContext& c, unsigned row);
+void RawPictureListReader(ReaderContext& c, unsigned row);
+void ScrambledNameReader(ReaderContext& c, unsigned row);
+void IndexedSoundBankReader(ReaderContext& c, unsigned row);
+void ChunkStreamReader(ReaderContext& c, unsigned row);
+void NameListReader(ReaderContext& c, unsigned row);
+// Nested folders, compressed directories and header-driven pictures
+// (header_pictures.cpp): 150, 142, 115, 78, 79 and 84.
+void NestedFolderReader(ReaderContext& c, unsigned row);
+void CompressedDirectoryReader(ReaderContext& c, unsigned row);
+void ImageBankReader(ReaderContext& c, unsigned row);
+void NamedPalettePictureReader(ReaderContext& c, unsigned row);
+void MipTextureReader(ReaderContext& c, unsigned row);
+void EmbeddedSheetReader(ReaderContext& c, unsigned row);
+
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);

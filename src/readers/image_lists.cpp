@@ -37,6 +37,7 @@
 //   and the data up to the end of the file. Entries are numbered, with ".jpg"
 //   or ".bik" for data that begins like a JPEG or a Bink video.
 
+#include <algorithm>
 #include <array>
 #include <string>
 #include <string_view>
@@ -71,7 +72,8 @@ void NameEntries(ReaderContext& c) {
     for (size_t i = 0; i < c.entries.size(); ++i) NumberEntry(c, i);
 }
 
-// The archive path with the extension of its file name replaced by `ext`.
+// The whole of the file beside the archive whose name is the archive's with
+// its extension replaced by `ext`.
 std::vector<uint8_t> ReadCompanion(const ReaderContext& c, std::string_view ext) {
   const size_t dot = c.archiveFileName.rfind('.');
   if (dot == std::string_view::npos) throw BadData("no extension to replace");
@@ -132,6 +134,7 @@ void ReadDirIndex(ReaderContext& c, ByteView index) {
       name += static_cast<char>(index.u8(p));
       last = EndsName(index.u8(p + 1));
     }
+    name.resize(std::min(name.find('\0'), name.size()));  // a zero character ends the name
     const uint32_t at = index.u32le(p), stored = index.u32le(p + 4);
     p += 8;
     const std::vector<uint8_t> head = ReadBlock(c, uint64_t{at} + 4, 6);
@@ -180,12 +183,14 @@ void ImageListReader(ReaderContext& c, unsigned row) {
   for (uint32_t i = 0; i < count; ++i) {
     const std::vector<uint8_t> header = ReadBlock(c, at, 16);
     const ByteView h(header);
-    int64_t bits = single ? 32 : static_cast<int8_t>(h.u8(12));
+    // The depth is a signed byte; a negative one would step back to an
+    // earlier image or crawl through the file.
+    const auto depth = static_cast<int8_t>(h.u8(12));
+    if (!single && depth < 0) throw BadData("image of negative depth");
+    uint64_t bits = single ? 32 : static_cast<uint64_t>(depth);
     if (r.widen24 && bits == 24) bits = 32;
-    const int64_t size = int64_t{h.u16le(8)} * h.u16le(10) * bits / 8 + (i == 0 ? 96 : 128);
-    // A negative depth would step back to an earlier image or stand still.
-    if (size <= 0) throw BadData("image of no size");
-    const uint32_t length = DerivedOffset(static_cast<uint64_t>(size));
+    const uint32_t length =
+        DerivedOffset(uint64_t{h.u16le(8)} * h.u16le(10) * bits / 8 + (i == 0 ? 96 : 128));
     AddEntry(c, {}, DerivedOffset(at), length, length);
     at += length;
   }
@@ -214,8 +219,8 @@ void EndOffsetTableReader(ReaderContext& c, unsigned) {
   const ByteView slots(block);
   NeedRoomFor(count, slots.size(), 4);
   c.entries.reserve(count);
-  for (uint64_t i = 0; i < count; ++i) {
-    AddEntry(c, {}, i == 0 ? 16 : slots.u32le(4 * i), 0, 0);
+  for (size_t i = 0; i < count; ++i) {
+    AddEntry(c, {}, i == 0 ? 16 : slots.u32le(4 * uint64_t{i}), 0, 0);
     NumberEntry(c, i);
   }
   SizesToNextOffset(c, end);

@@ -25,7 +25,7 @@ CAIRN_SAMPLES(ImageListSamples) {
   list82.u32(0xFFFFFFFF).u32(0).u32(32).padTo(32).bytes(s);
   list83.text("LIST").padTo(64).u32(0xFFFFFFFF).u32(0).u32(32).padTo(84).u32(3).padTo(96);
   list83.bytes(x).bytes(y).bytes(z);
-  end91.padTo(12).u32(2).padTo(20).u32(99).u32(8).padTo(32).bytes(a).bytes(b).u32(32).u32(5);
+  end91.padTo(12).u32(2).padTo(24).u32(8).u32(107).bytes(a).bytes(b).u32(32).u32(5);
   end91.fill(12).text("a.txt").u8(0).u32(37).u32(70).fill(12).text("x/b.dat").u8(0);
   end93.text("ENDT").u32(104).u32(104).u32(1).bytes(Pattern(84, 3)).u32(7).u32(60);
   // The count at 0 and the first offset are fixed by the header the format opens with.
@@ -88,7 +88,7 @@ TEST(ImageLists, RefusesBrokenListsAndTables) {
   ExpectRefused({
       {"81 table without its marker", 81, With(rows[0], 80, 0)},
       {"83 image of negative depth", 83, With(rows[2], 108, 0x80)},
-      {"91 directory past the end", 91, With(rows[3], 20, 0xFFFFFFF0)},
+      {"91 directory past the end", 91, With(rows[3], 28, 0xFFFFFFF0)},
       {"93 table before the start", 93, With(rows[4], 4, 3)},
       {"93 offsets going back", 93, With(rows[4], 104, 10)},
       {"index missing", 143, rows[6].bytes},

@@ -12,9 +12,9 @@
 //   sized as 32-bit; 82 counts at 20 with the images from 32; 83 counts at 84
 //   with the images from 96. In 82 and 83 a count of 0 is one 32-bit image.
 //   A list of one image is named after the archive, longer ones are numbered.
-// - Name directory at the end (91): a count at 12; the records run from the
-//   header word at 20 plus 4 per entry to the end of the file: offset, size,
-//   12 spare bytes and a zero-terminated name.
+// - Name directory at the end (91): a count at 12; the word 4 per entry past
+//   20 tells where the records start, and they run to the end of the file:
+//   offset, size, 12 spare bytes and a zero-terminated name.
 // - Offset table at the end (93): from 4 before the header word at 4 to the
 //   end of the file, one offset per entry (one more than the count at 12);
 //   the first slot is not an offset, the first entry is at 16. Each entry
@@ -199,7 +199,9 @@ void ImageListReader(ReaderContext& c, unsigned row) {
 
 void EndDirectoryReader(ReaderContext& c, unsigned) {
   const uint32_t count = c.header.u32le(12);
-  const std::vector<uint8_t> block = ReadToEnd(c, c.header.u32le(20) + uint64_t{4} * count);
+  // With many entries that word lies past the header, so it is read from the file.
+  const uint32_t start = ByteView(ReadBlock(c, 20 + uint64_t{4} * count, 4)).u32le(0);
+  const std::vector<uint8_t> block = ReadToEnd(c, start);
   const ByteView d(block);
   NeedRoomFor(count, d.size(), 21);
   c.entries.reserve(count);
@@ -218,7 +220,7 @@ void EndOffsetTableReader(ReaderContext& c, unsigned) {
   const std::vector<uint8_t> block = ReadToEnd(c, end - 4);
   const ByteView slots(block);
   NeedRoomFor(count, slots.size(), 4);
-  c.entries.reserve(count);
+  c.entries.reserve(static_cast<size_t>(count));
   for (size_t i = 0; i < count; ++i) {
     AddEntry(c, {}, i == 0 ? 16 : slots.u32le(4 * uint64_t{i}), 0, 0);
     NumberEntry(c, i);

@@ -265,7 +265,9 @@ TEST(Cli, FormatsListsAllFormatsWithTheirReadability) {
   EXPECT_NE(r.out.find("\n 34  pwad "), std::string::npos);
   EXPECT_NE(r.out.find("\n157 formats, " + std::to_string(readable) + " readable\n"),
             std::string::npos);
-  EXPECT_EQ(std::count(r.out.begin(), r.out.end(), '\n'), 159);
+  EXPECT_NE(r.out.find("\n91 is not reached by recognition: a header whose first word is 0 "),
+            std::string::npos);
+  EXPECT_EQ(std::count(r.out.begin(), r.out.end(), '\n'), 159 + 2);  // 91 and 130 noted
 }
 
 TEST(Cli, UsageErrorsAndHelp) {

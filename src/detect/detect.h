@@ -38,4 +38,12 @@ FormatId MatchSignature(ByteView header);
 // from kNoFile simply fail). Answers 80..157 or 0.
 FormatId DetectByRules(ByteView header, std::string_view path, os::Handle h, uint32_t size);
 
+// The formats that recognition never answers, each with the reason: a rule
+// earlier in the order takes every header they could have.
+struct UnreachableFormat {
+  FormatId id;
+  std::string_view why;
+};
+std::span<const UnreachableFormat> UnreachableFormats();
+
 }  // namespace cairn

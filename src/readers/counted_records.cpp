@@ -195,13 +195,13 @@ void NumberEntry(ReaderContext& c, size_t i, std::string_view extension) {
   c.entries.at(i).Name = std::move(name);
 }
 
-void SizesToNextOffset(ReaderContext& c) {
-  uint32_t end = c.fileSize;
-  for (size_t i = c.entries.size(); i-- > 0;) {
-    if (c.entries[i].Offset > end) throw BadData("entries out of order");
-    end = c.entries[i].Offset;
+void SizesToNextOffset(ReaderContext& c, uint32_t end) {
+  if (end == 0) end = c.fileSize;
+  for (uint32_t last = end, i = static_cast<uint32_t>(c.entries.size()); i-- > 0;) {
+    if (c.entries[i].Offset > last) throw BadData("entries out of order");
+    last = c.entries[i].Offset;
   }
-  SizesFromOffsets(c, 0);
+  SizesFromOffsets(c, end);
 }
 
 void ReadNamedSizeRecords(ReaderContext& c, ByteView directory, uint32_t count, uint32_t gap,

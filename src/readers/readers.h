@@ -115,8 +115,8 @@ inline void NeedRoomFor(uint64_t count, uint64_t bytes, uint64_t minimum) {
 // Names entry `i` after the archive file and its index, then `extension`.
 void NumberEntry(ReaderContext& c, size_t i, std::string_view extension = {});
 // SizesFromOffsets for a directory whose offsets must not go back nor lie
-// past the end of the file; one that does is refused.
-void SizesToNextOffset(ReaderContext& c);
+// past `end` (the end of the file when 0); one that does is refused.
+void SizesToNextOffset(ReaderContext& c, uint32_t end = 0);
 // Adds `count` records from the start of `directory`: a zero-terminated
 // name, `gap` spare bytes, offset, unpacked and packed size, `tail` spare
 // bytes.
@@ -208,5 +208,15 @@ void EmbeddedSheetReader(ReaderContext& c, unsigned row);
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);
+
+// Image lists, trailing tables and companion indexes (image_lists.cpp): image
+// lists row 0 behind a located table (81), 1 after 32 bytes (82), 2 after 96
+// (83); companion indexes row 0 ".fat" (143), 1 ".rfh" (108), 2 ".dir" (121).
+void ImageListReader(ReaderContext& c, unsigned row);
+void EndDirectoryReader(ReaderContext& c, unsigned row);       // 91
+void EndOffsetTableReader(ReaderContext& c, unsigned row);     // 93
+void TrailingNameTableReader(ReaderContext& c, unsigned row);  // 116
+void CompanionIndexReader(ReaderContext& c, unsigned row);
+void ScrambledSizeChainReader(ReaderContext& c, unsigned row);  // 154
 
 }  // namespace cairn

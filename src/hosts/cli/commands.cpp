@@ -340,6 +340,8 @@ int FormatsCommand() {
     fmt::print("{:>3}  {:<{}}  {:<8}  {}\n", f.id, f.shortName, w, f.reader ? "yes" : "no",
                f.description);
   fmt::print("{} formats, {} readable\n", AllFormats().size(), readable);
+  for (const UnreachableFormat& u : UnreachableFormats())
+    fmt::print("{} is not reached by recognition: {}\n", u.id, u.why);
   return kExitDone;
 }
 

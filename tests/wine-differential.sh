@@ -12,6 +12,10 @@ windows=$(realpath "$2")
 wine=$(command -v wine64 || echo /usr/lib/wine/wine64)
 export WINEDEBUG=-all WINEPREFIX=${WINEPREFIX:-$HOME/.cache/cairn-wine}
 mkdir -p "$(dirname "$WINEPREFIX")"
+# A server of an earlier run that is still shutting down drops new clients:
+# wait for it to end first.
+wineserver=$(command -v wineserver || echo /usr/lib/wine/wineserver64)
+"$wineserver" -w 2>/dev/null || true
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 

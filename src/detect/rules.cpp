@@ -146,17 +146,6 @@ bool FileU32(const Facts& f, int64_t position, uint32_t& value) {
   return true;
 }
 
-// The archive path with the extension of its last part replaced by `ext`;
-// empty when the last part has no '.'.
-std::string CompanionPath(std::string_view path, std::string_view ext) {
-  const size_t dot = path.rfind('.');
-  const size_t cut = path.find_last_of(kPathSeparators);
-  if (dot == std::string_view::npos || (cut != std::string_view::npos && dot < cut)) return {};
-  std::string p(path.substr(0, dot));
-  p += ext;
-  return p;
-}
-
 // The archive has extension `archiveExt` and a companion with `companionExt`
 // beside it that opens (and, when `firstBytes` is given, begins with them).
 // The companion is closed again before the next rule.

@@ -41,15 +41,6 @@ uint32_t Fit32(uint64_t v) {
   return static_cast<uint32_t>(v);
 }
 
-// The path with the extension of its last part replaced by `ext`; empty when
-// the last part has none.
-std::string CompanionPath(std::string_view path, std::string_view ext) {
-  const size_t dot = path.rfind('.');
-  const size_t cut = path.find_last_of(kPathSeparators);
-  if (dot == std::string_view::npos || (cut != std::string_view::npos && dot < cut)) return {};
-  return std::string(path.substr(0, dot)).append(ext);
-}
-
 struct ChunkKind {
   uint32_t tag;
   uint32_t second;  // the word at 8 the tag needs as well; 0: any

@@ -205,6 +205,19 @@ void NamedPalettePictureReader(ReaderContext& c, unsigned row);
 void MipTextureReader(ReaderContext& c, unsigned row);
 void EmbeddedSheetReader(ReaderContext& c, unsigned row);
 
+// Offset tables and directories beside the archive (companion_files.cpp):
+// 90, 98 (the ".dir" companion), 110, 130, 133, 148 and 153.
+void OffsetNameReader(ReaderContext& c, unsigned row);
+void SectorDirectoryReader(ReaderContext& c, unsigned row);
+void HeadTableReader(ReaderContext& c, unsigned row);
+void NumberedRecordReader(ReaderContext& c, unsigned row);
+void TrailingDataReader(ReaderContext& c, unsigned row);
+void SeparateNameReader(ReaderContext& c, unsigned row);
+void EmptyNameEndReader(ReaderContext& c, unsigned row);
+// One picture or stream a file (single_pictures.cpp): row 0 131, 1 134, 2
+// 139, 3 140, 4 141, 5 145, 6 149, 7 125, 8 109.
+void SinglePictureReader(ReaderContext& c, unsigned row);
+
 // Enciphered sound banks (sound_banks.cpp): row 0 the station banks (65), 1
 // the banks with a second length (66).
 void SoundBankReader(ReaderContext& c, unsigned row);

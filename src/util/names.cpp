@@ -43,6 +43,15 @@ std::string_view StripExtension(std::string_view name) {
   return {};
 }
 
+std::string CompanionPath(std::string_view path, std::string_view ext) {
+  const size_t dot = path.rfind('.');
+  const size_t cut = path.find_last_of(kPathSeparators);
+  if (dot == std::string_view::npos || (cut != std::string_view::npos && dot < cut)) return {};
+  std::string p(path.substr(0, dot));
+  p += ext;
+  return p;
+}
+
 void ToBackslashes(std::string& name) {
   std::replace(name.begin(), name.end(), '/', '\\');
 }

@@ -35,6 +35,10 @@ std::string_view PathExtension(std::string_view path);
 // last path part ('\' separates parts). Empty when the last part has no dot.
 std::string_view StripExtension(std::string_view name);
 
+// The path with the extension of its last part replaced by `ext` (a
+// companion file beside an archive); empty when the last part has no '.'.
+std::string CompanionPath(std::string_view path, std::string_view ext);
+
 // Replaces every '/' by '\'.
 void ToBackslashes(std::string& name);
 

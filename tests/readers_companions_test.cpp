@@ -22,25 +22,21 @@ CAIRN_SAMPLES(CompanionSamples) {
   heads.u32(2).u32(12).u32(57).fill(4).u32(5).name("first", 16).fill(16).bytes(a);
   heads.fill(4).u32(70).text(n16).text("cut").fill(13).bytes(b);
   unnamed.fill(8).u32(2).padTo(28).u32(56).u32(5).fill(8).u32(61).u32(70).fill(4).bytes(a).bytes(b);
-  // The byte after the last record is spare; the data starts behind it.
   bigf.text("BIGF").padTo(80).text("one").u8(0).u32(5).u32(0).text("two").u8(0).u32(250).u32(5);
   bigf.u8(0xEE).bytes(a).bytes(c);
   wd.u32(2).u32(72).u32(5).fill(12).u32(10).u32(77).u32(70).fill(12).u32(0).u32(16);
   wd.text("dir/b.bin").u8(0).text("a.txt").u8(0).bytes(a).bytes(b);
   ended.u32(21).text("A").u8(0).u32(26).text("B").u8(0).u32(276).fill(5).bytes(a).bytes(c);
-  B dir = B().u32(0).u32(1).name("a.bin", 24).u32(1).u32(2).name("b.bin", 24);
-  Sample sector = Row({"sectors", 98, "disc.img", s},
-                      {{"a.bin", 0, Slice(s, 0, 2048)}, {"b.bin", 2048, Slice(s, 2048, 4096)}});
-  sector.companions = {{"disc.dir", dir.u32(3).u32(0).name("c", 28).get()}};  // 4 spare bytes
-  sector = Row(sector, {{"c", 6144, {}}});
-  Sample records = Row({"16-byte records", 130, "x.rec", unnamed.get()},
-                       {{"x.rec.000000", 56, a}, {"x.rec.000001", 61, b}});
-  records.recognised = false;  // the rule taking every first word of 0 comes first
+  // The last record has 4 spare bytes behind it.
+  const Bytes dir = B().u32(1).u32(2).name("b.bin", 24).u32(3).u32(0).name("c", 28).get();
   return {
       Row({"offsets", 90, "game.dat", derived.get()}, {{"A", 17, Pattern(33)}, {"BC", 50, b}}),
-      sector,
+      Row({"sectors", 98, "disc.img", s, {}, {}, {{"disc.dir", dir}}},
+          {{"b.bin", 2048, Slice(s, 2048, 4096)}, {"c", 6144, {}}}),
       Row({"40-byte heads", 110, "game.hdr", heads.get()}, {{"first", 52, a}, {n16, 97, b}}),
-      records,
+      // The rule taking every first word of 0 comes before this one.
+      Row({"16-byte records", 130, "x.rec", unnamed.get(), {}, {}, {}, false},
+          {{"x.rec.000000", 56, a}, {"x.rec.000001", 61, b}}),
       Row({"data behind", 133, "game.big", bigf.get()}, {{"one", 105, a}, {"two", 110, c}}),
       Row({"name block", 148, "game.wd", wd.get()}, {{"a.txt", 72, a}, {"dir\\b.bin", 77, b}}),
       Row({"empty name", 153, "game.dat", ended.get()}, {{"A", 21, a}, {"B", 26, c}}),

@@ -54,20 +54,19 @@ CAIRN_SAMPLES(SinglePictureSamples) {
   nif.padTo(107).u32(2).u32(2).padTo(125).bytes(Pattern(12));
   const Bytes olz = Cat({{0xFB}, Pattern(112), {0, 0, 0xFC}}), z = Compress(inner, 0);
   const auto zs = uint32_t(z.size());
-  Bytes area = Cat({px, Bytes(10)});  // 9 x 5 pixels, bottom row first, rows padded to 20 bytes
-  ArrangeBmpRows(area, 18, 5);
-  const Bytes bmp = Cat({BmpHeader(166, 9, 5, 16), area});
+  B bmp = B().bytes(BmpHeader(166, 9, 5, 16));  // 9 x 5 pixels, bottom row first, rows of 20 bytes
+  for (int row = 4; row >= 0; --row) bmp.bytes(Slice(px, row * 18, 18)).fill(2);
   return {
       One("photo01.syj", 131, syj, {"photo01.jpg", 0, 212, 202, 0, 0}, Cat({JpegStart(), syj})),
       One("sky.555", 134, r555, {"sky.tga", 0, 122, 104, 0, 16}, Cat({TgaHeader(0, 16, 32), r555})),
       One("wall.tex", 139, tex, {"wall.tga", 22, 108, 90, 0x50009, 16},
           Cat({TgaHeader(0x50009, 16, 32), px})),
-      One("wall.565", 140, tex, {"wall.bmp", 22, 166, 90, 0x50009, 0}, bmp),
+      One("wall.565", 140, tex, {"wall.bmp", 22, 166, 90, 0x50009, 0}, bmp.get()),
       One("walk.anm", 141, anm, {"walk.tga", 12, 114, 96, 0xD0004, 16},
           Cat({TgaHeader(0xD0004, 16, 32), Slice(anm, 12, 96)})),
       One("tex.nif", 145, nif.get(), {"tex.nif.tga", 0, 30, 137, 0x20002, 2},
           Cat({TgaHeader(0x20002, 24, 32), Pattern(12)})),
-      One("picture.rsb", 149, rsb, {"picture.rsb.bmp", 28, 166, 90, 0x50009, 0}, bmp),
+      One("picture.rsb", 149, rsb, {"picture.rsb.bmp", 28, 166, 90, 0x50009, 0}, bmp.get()),
       One("car.qfs", 125, Cat({{16, 0xFB, 0, 0, 115}, olz}), {"car.fsh", 5, 115, 116, 0, 0},
           Cat({Pattern(112), Bytes(3, 0x0A)})),
       Entries(

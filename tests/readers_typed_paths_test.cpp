@@ -49,13 +49,10 @@ CAIRN_SAMPLES(TypedPathSamples) {
 
 TEST(TypedPaths, RefusesBrokenDirectories) {
   const SampleTable rows = TypedPathSamples();
-  const auto lines = [](const std::string& name) {
-    return B().u32(0xF4EA1072).u32(0).u32(16).u32(1).text(name).fill(8).padTo(kHeaderSize).get();
-  };
   ExpectRefused({
       {"H4R window past the end", 44, Slice(rows[1].bytes, 0, 345)},
-      {"newline name without its newline", 48, lines("name")},
-      {"newline name of 260", 48, lines(std::string(260, 'n') + "\n")},
+      {"newline name without its newline", 48, Cat({Slice(rows[2].bytes, 0, 96), Bytes(8)})},
+      {"newline name of 260", 48, Cat({Slice(rows[2].bytes, 0, 91), Bytes(260, 'n'), Text("\n")})},
       {"BIG offsets going back", 52, With(rows[3], 76, 98)},
   });
 }

@@ -39,8 +39,7 @@ Sample Chunks(Sample s, const std::vector<Chunk>& chunks, uint16_t w, uint8_t d 
 
 CAIRN_SAMPLES(BlockStreamSamples) {
   const Bytes a = Pattern(90, 1), b = Pattern(40, 2), c = Pattern(60, 3);
-  // Slots 28, 0, 107, 70, 28; bit 29 of the first record header is set, the
-  // last record is too short for one.
+  // Slots 28, 0, 107, 70, 28; the first record header has bit 29, the last no room for one.
   B t;
   t.u32(24).u16(5).u16(3000).u32(28).u32(0).u32(107).u32(70).u32(28).u32(1 << 29).fill(38, 8);
   t.u32(7).fill(36, 9);
@@ -56,7 +55,6 @@ CAIRN_SAMPLES(BlockStreamSamples) {
   k.fill(17).bytes(pixels).text("NLAP").u32(0x30000000 | 47).fill(4).u32(2 | 1 << 16).fill(17);
   const Bytes tgl = k.bytes(indexed).text("DAEH").u32(20).fill(12, 5).get();
   const Bytes kps = B().text("KPS").u32(0).u8(0).u32(116).bytes(Slice(tgl, 12, 112)).get();
-  // The table at 104 begins with zero, so its offsets start at its 16th word.
   B n;
   n.u32(40).u32(8232).u32(3).u32(4).padTo(168).u32(180).u32(284).u32(0).u32(104).text("ABGR");
   n.fill(8).u32(1 | 2 << 16).fill(16).text("hero").fill(5).bytes(pixels).padTo(284).u32(104);

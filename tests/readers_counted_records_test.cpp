@@ -14,17 +14,13 @@ CAIRN_SAMPLES(CountedRecordSamples) {
   B awad, mjz, mh3, ver, mqdb, ezd, mix, thu, sdpa, lp;
   awad.text("AWAD").u32be(2).name("title.pcx", 16).u32be(5).u32be(64).u32(0);
   awad.name(full, 16).u32be(70).u32be(69).u32(0).bytes(a).bytes(b);
-  // The second record is deleted.
   mjz.text("MJZ0").u32(0).u32(3).padTo(16).name("a.txt", 128).u32(0).u32(448).u32(5).u32(0);
   mjz.name("gone", 128).u32(1).u32(453).u32(10).u32(0).name("c.dat", 128).u32(2).u32(453);
   mjz.u32(10).u32(0).bytes(a).bytes(c);
-  // "****" ends the list before the region does.
   mh3.text("MH3 V1.0 ").padTo(48).u32(320).padTo(64).name("one", 48).u32(320).u32(5).fill(8);
   mh3.name("two", 48).u32(325).u32(10).fill(8).name("****", 64).name("three", 64).bytes(a).bytes(c);
-  // Sizes count whole sectors, whatever the data holds.
   ver.text("VER2").u32(2).u32(1).u32(1).name(name24, 24).u32(2).u32(0).name("empty", 24);
   ver.padTo(2048).bytes(sector);
-  // Positions are 28 short of the data, whose first bytes tell the extension.
   const Bytes riff = Cat({Text("RIFF"), a}), png = Cat({Text("\x89PNG"), c});
   mqdb.text("MQDB").padTo(24).u32(28).u32(3).u32(0).u32(9).u32(52).u32(0).u32(0).u32(14).u32(61);
   mqdb.u32(0).u32(0).u32(5).u32(75).u32(0).bytes(riff).bytes(png).bytes(a);
@@ -33,7 +29,6 @@ CAIRN_SAMPLES(CountedRecordSamples) {
   ezd.text("ezd\xFF").u32(2).u32(60).padTo(16).text("a.txt").u8(0).fill(5).u32(60).u32(5);
   ezd.u32(azSize).text("x/b").u8(0).fill(5).u32(60 + azSize).u32(70).u32(bzSize);
   ezd.bytes(az).bytes(bz);
-  // Names 4 past the word at 8, each ending at its length or its first zero.
   mix.text("MIX1").u32(16).u32(44).padTo(16).u32(2).u32(0).u32(61).u32(5).u32(0).u32(66).u32(70);
   mix.u32(0).u8(5).text("a.txt").u8(6).text("b.d").fill(3, 0).bytes(a).bytes(b);
   thu.text("THU3").u32(3).u32(108).padTo(16).u32(0).u32(111).fill(16).u32(3).text("one").u32(0);
@@ -42,9 +37,6 @@ CAIRN_SAMPLES(CountedRecordSamples) {
   sdpa.text("SDPA").u32(2).u32(32).u32(5).u32(0).u32(37).u32(70).u32(0).bytes(a).bytes(b);
   lp.text("LP1C").u32(0).u32(2).u8(9).text("intro.smk").u32(5).u32(62).fill(8);
   lp.u8(7).text("x/y.txt").u32(70).u32(67).fill(8).bytes(a).bytes(b);
-  Sample z = Row({"ezd", 64, "data.ezd", ezd.get()}, {{"a.txt", 60, a}, {"x\\b", 60 + azSize, b}});
-  z.listing[0].packed = azSize;
-  z.listing[1].packed = bzSize;
   return {
       Row({"AWAD", 59, "game.awd", awad.get()}, {{"title.pcx", 64, a}, {full, 69, b}}),
       Row({"MJZ0", 60, "game.mjz", mjz.get()}, {{"a.txt", 448, a}, {"c.dat", 453, c}}),
@@ -52,7 +44,8 @@ CAIRN_SAMPLES(CountedRecordSamples) {
       Row({"VER2", 62, "game.ver", ver.get()}, {{name24, 2048, sector}, {"empty", 4096, {}}}),
       Row({"MQDB", 63, "m.db", mqdb.get()},
           {{"m.db.000000.wav", 80, riff}, {"m.db.000001.png", 89, png}, {"m.db.000002", 103, a}}),
-      z,
+      Entries({"ezd", 64, "data.ezd", ezd.get()},
+              {{{"a.txt", 60, 5, azSize, 0, 0}, a}, {{"x\\b", 60 + azSize, 70, bzSize, 0, 0}, b}}),
       Row({"MIX1", 67, "game.mix", mix.get()}, {{"a.txt", 61, a}, {"b.d", 66, b}}),
       Row({"THU3", 68, "a.thu", thu.get()}, {{"one", 111, a}, {"two.wav", 116, {}}, {"x", 116, b}}),
       Row({"SDPA", 69, "v", sdpa.get()}, {{"v.000000.wav", 32, a}, {"v.000001.wav", 37, b}}),
@@ -61,18 +54,15 @@ CAIRN_SAMPLES(CountedRecordSamples) {
 }
 
 TEST(CountedRecords, RefusesBrokenDirectories) {
-  const SampleTable rows = CountedRecordSamples();  // with(): a row with one word changed
-  const auto with = [&](size_t row, size_t at, uint32_t v) {
-    return B().bytes(rows[row].bytes).patch32(at, v).get();
-  };
+  const SampleTable rows = CountedRecordSamples();
   ExpectRefused({
-      {"MH3 region ending before 64", 61, with(2, 48, 63)},
-      {"VER2 sector beyond 4 GiB", 62, with(3, 8, 0x200000)},
-      {"MQDB data past the end", 63, with(4, 40, 200)},
-      {"MIX1 names before the records", 67, with(6, 8, 12)},
-      {"THU3 name of 260", 68, with(7, 40, 260)},
-      {"THU3 offsets going back", 68, with(7, 51, 117)},
-      {"LP1C negative name length", 74, with(9, 12, 0x746E6980)},  // 0x80, then "int"
+      {"MH3 region ending before 64", 61, With(rows[2], 48, 63)},
+      {"VER2 sector beyond 4 GiB", 62, With(rows[3], 8, 0x200000)},
+      {"MQDB data past the end", 63, With(rows[4], 40, 200)},
+      {"MIX1 names before the records", 67, With(rows[6], 8, 12)},
+      {"THU3 name of 260", 68, With(rows[7], 40, 260)},
+      {"THU3 offsets going back", 68, With(rows[7], 51, 117)},
+      {"LP1C negative name length", 74, With(rows[9], 12, 0x746E6980)},  // 0x80, then "int"
   });
 }
 

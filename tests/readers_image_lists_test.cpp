@@ -18,13 +18,13 @@ CAIRN_SAMPLES(ImageListSamples) {
   const Bytes a = Pattern(5, 1), b = Pattern(70, 2), c = Pattern(12, 3),
               p = Image(2, 2, 24, 112, 4);
   const Bytes q = Image(4, 2, 8, 136, 5), s = Image(4, 2, 8, 128, 6), x = Image(16, 16, 8, 352, 7);
-  const Bytes y = Image(16, 16, 8, 384, 8), z = Image(16, 16, 8, 384, 9);
+  const Bytes y = Image(16, 16, 8, 384, 8);
   B list81, list82, list83, end91, end93, trail, names, fat, fatIndex, rfd, rfh, pak, dir, psc;
   list81.u32(0xFFFFFFFF).u32(0).u32(0).u32(80).u32(80).padTo(80).u32(0xFFFFFFFF).padTo(100).u32(2);
   list81.padTo(112).bytes(p).bytes(q);
   list82.u32(0xFFFFFFFF).u32(0).u32(32).padTo(32).bytes(s);
-  list83.text("LIST").padTo(64).u32(0xFFFFFFFF).u32(0).u32(32).padTo(84).u32(3).padTo(96);
-  list83.bytes(x).bytes(y).bytes(z);
+  list83.text("LIST").padTo(64).u32(0xFFFFFFFF).u32(0).u32(32).padTo(84).u32(2).padTo(96);
+  list83.bytes(x).bytes(y);
   end91.padTo(12).u32(2).padTo(24).u32(8).u32(107).bytes(a).bytes(b).u32(32).u32(5);
   end91.fill(12).text("a.txt").u8(0).u32(37).u32(70).fill(12).text("x/b.dat").u8(0);
   end93.text("ENDT").u32(104).u32(104).u32(1).bytes(Pattern(84, 3)).u32(7).u32(60);
@@ -48,7 +48,6 @@ CAIRN_SAMPLES(ImageListSamples) {
   rfd.u32(5).bytes(a).u32(70).bytes(bz).padTo(104);
   rfh.u32(5).u32(0).u32(0).u32(9).u32(5).u32(0).text("a.txt");
   rfh.u32(7).u32(0).u32(1).u32(bzSize + 4).u32(70).u32(9).text("x/b.dat");
-  // The unpacked size 70 is kept XORed with 0x5A in its three low bytes.
   pak.bytes(c).u32(0).u32(0x5A5A5A1C).bytes(dz).padTo(104);
   dir.text("a\x01.\x40t\x81x\xFFt\xC8").u32(0).u32(12).text("b\x08").u32(12).u32(dzSize + 8);
   constexpr uint32_t kKey = 0x3A91C4D7;
@@ -56,16 +55,15 @@ CAIRN_SAMPLES(ImageListSamples) {
   for (int i = 0; i < 4; ++i) psc.u32(0x99A1A220);
   const Bytes jpg = Cat({Text("\xFF\xD8\xFF\xE0"), a}), bik = Cat({Text("BIKi"), b});
   psc.padTo(132).u32(9 ^ kKey).bytes(jpg).u32(74 ^ kKey).bytes(bik).u32(12 ^ kKey).bytes(c);
-  Sample e = Row({"name directory at the end", 91, "e.dat", end91.get()},
-                 {{"a.txt", 32, a}, {"x\\b.dat", 37, b}});
-  e.recognised = false;  // a header whose first word is 0 is always a tagged chunk stream
   return {
       Row({"image list behind a table", 81, "a.spr", list81.get()},
           {{"a.spr.000000", 112, p}, {"a.spr.000001", 224, q}}),
       Row({"image list of one image", 82, "one.spr", list82.get()}, {{"one.spr", 32, s}}),
       Row({"image list after 96 bytes", 83, "b.spr", list83.get()},
-          {{"b.spr.000000", 96, x}, {"b.spr.000001", 448, y}, {"b.spr.000002", 832, z}}),
-      e,
+          {{"b.spr.000000", 96, x}, {"b.spr.000001", 448, y}}),
+      // A header whose first word is 0 is always taken for a tagged chunk stream.
+      Row({"name directory at the end", 91, "e.dat", end91.get(), {}, {}, {}, false},
+          {{"a.txt", 32, a}, {"x\\b.dat", 37, b}}),
       Row({"offset table at the end", 93, "t.bin", end93.get()},
           {{"t.bin.000000", 16, Slice(end93.get(), 16, 44)},
            {"t.bin.000001", 60, Slice(end93.get(), 60, 44)}}),

@@ -57,7 +57,6 @@ TEST(SequentialNames, RefusesBrokenDirectories) {
       {"name of 260", 144, With(s[7], 20, 260)},
       {"more records than the directory holds", 132, With(s[9], 8, 0x03000000)},
   });
-  // A name without a space reaches over the offset and the size.
   Bytes longName = s[6].bytes;
   std::fill_n(longName.begin() + 296, 79, 'n');
   ExpectLists(119, longName,

@@ -8,29 +8,21 @@ namespace {
 
 using B = ArchiveBuilder;
 
-Sample Listing(Sample s, std::vector<Listed> listing, std::vector<Bytes> data) {
-  s.listing = std::move(listing);
-  s.data = std::move(data);
-  return s;
-}
-
 CAIRN_SAMPLES(TypedPathSamples) {
   const Bytes a = Pattern(5, 1), b = Pattern(70, 2), c = Pattern(10, 3);
   B gaba, wav, h4r, lines, big, res;
-  // Type 0x24 is MP3; type 6 is PCM, extracted behind a WAV header.
   gaba.text("GABA").u32(4).u32(3).u32(0).name("music", 32).u32(208).u32(5).u32(44100).u32(0x24);
   gaba.fill(16).name("shot", 32).u32(213).u32(70).u32(22050).u32(6).fill(16);
   gaba.name("voice.raw", 32).u32(283).u32(10).u32(8000).u32(9).fill(16).bytes(a).bytes(b).bytes(c);
   wav.text("RIFF").u32(102).text("WAVEfmt ").u32(16).u32(0x10001).u32(22050).u32(44100).u16(2);
   wav.u16(16).text("data").bytes(b);
-  // "C:\" keeps the letter; code 3 is gzip; each record is read as 260 bytes.
+  // The third path, ".\maps\", loses its '.' and then its leading '\'.
   h4r.text("H4R\x05").u32(8).u32(3).u32(125).u32(5).fill(8).u16(9).text("intro.smk").u16(0);
   h4r.u16(1).u16(0).u32(130).u32(10).fill(8).u16(8).text("kick.wav").u16(7).text("C:\\snd\\");
-  h4r.u16(0).u16(3).u16(0).u32(140).u32(70).fill(8).u16(5).text("a.map").u16(10);
-  h4r.text("data\\maps\\").u16(1).u16(0).bytes(a).bytes(c).bytes(b).padTo(346);
-  // A ':' or '.' second and then a '.' first become '_'.
-  lines.u32(0xF4EA1072).u32(0).u32(101).u32(3).bytes(a).bytes(b).bytes(c).text("..cfg\n");
-  lines.u32(16).u32(5).text("C:/x.txt\n").u32(21).u32(70).text(".a\n").u32(91).u32(10);
+  h4r.u16(0).u16(3).u16(0).u32(140).u32(70).fill(8).u16(5).text("a.map").u16(7);
+  h4r.text(".\\maps\\").u16(1).u16(0).padTo(125).bytes(a).bytes(c).bytes(b).padTo(346);
+  lines.u32(0xF4EA1072).u32(0).u32(91).u32(2).bytes(a).bytes(b).text("..cfg\n").u32(16).u32(5);
+  lines.text("C:/x.txt\n").u32(21).u32(70);
   big.text("BIG").u32(0).padTo(8).u32(3).padTo(68).u32(92).u32(0).u32(97).u32(0).u32(97).u32(0);
   big.bytes(a).bytes(b);
   const Bytes az = Compress(a), bz = Compress(b);
@@ -39,39 +31,29 @@ CAIRN_SAMPLES(TypedPathSamples) {
   res.bytes(az).bytes(bz).text("pic.bmp").u8(0).fill(12).u32(49).u32(5).u32(azSize).u32(0);
   res.text("snd/x.wav").u8(0).fill(12).u32(49 + azSize).u32(70).u32(bzSize).u32(0);
   return {
-      Listing({"GABA", 41, "sfx.gab", gaba.get()},
-              {{"music.mp3", 208, 5, 5, 44100, 0},
-               {"shot.wav", 213, 110, 70, 22050, 1},
-               {"voice.raw", 283, 10, 10, 8000, 0}},
-              {a, wav.get(), c}),
+      Entries({"GABA", 41, "sfx.gab", gaba.get()},
+              {{{"music.mp3", 208, 5, 5, 44100, 0}, a},
+               {{"shot.wav", 213, 110, 70, 22050, 1}, wav.get()},
+               {{"voice.raw", 283, 10, 10, 8000, 0}, c}}),
       Row({"H4R", 44, "maps.h4r", h4r.get()},
-          {{"intro.smk", 125, a}, {"C_\\snd\\kick.wav.gz", 130, c}, {"data\\maps\\a.map", 140, b}}),
+          {{"intro.smk", 125, a}, {"C_\\snd\\kick.wav.gz", 130, c}, {"maps\\a.map", 140, b}}),
       Row({"newline directory", 48, "game.dat", lines.get()},
-          {{"__cfg", 16, a}, {"C_\\x.txt", 21, b}, {"_a", 91, c}}),
+          {{"__cfg", 16, a}, {"C_\\x.txt", 21, b}}),
       Row({"BIG", 52, "data.big", big.get()},
           {{"data.big.000000", 92, a}, {"data.big.000001", 97, {}}, {"data.big.000002", 97, b}}),
-      Listing({"signature row 57", 57, "game.res", res.get()},
-              {{"pic.bmp", 49, 5, azSize, 0, 1}, {"snd\\x.wav", 49 + azSize, 70, bzSize, 0, 1}},
-              {a, b}),
+      Entries({"signature row 57", 57, "game.res", res.get()},
+              {{{"pic.bmp", 49, 5, azSize, 0, 1}, a},
+               {{"snd\\x.wav", 49 + azSize, 70, bzSize, 0, 1}, b}}),
   };
 }
 
-// An H4R path whose second character is '\' loses its first, and the '\' it
-// then begins with.
-TEST(TypedPaths, KeepsTheH4rPathQuirkAndRefusesBrokenDirectories) {
-  B h4r;
-  h4r.text("H4R\x05").u32(8).u32(1).u32(0).u32(0).fill(8).u16(1).text("f").u16(2).text(".\\");
-  auto o = OpenBytesAs(44, h4r.u16(1).u16(0).padTo(272).get());
-  EXPECT_EQ(o->listing(), (std::vector<Listed>{{"f", 0, 0, 0, 0, 0}}));
+TEST(TypedPaths, RefusesBrokenDirectories) {
   const SampleTable rows = TypedPathSamples();
-  const auto lines = [](const std::string& name) {
-    return B().u32(0xF4EA1072).u32(0).u32(16).u32(1).text(name).fill(8).padTo(kHeaderSize).get();
-  };
   ExpectRefused({
       {"H4R window past the end", 44, Slice(rows[1].bytes, 0, 345)},
-      {"newline name without its newline", 48, lines("name")},
-      {"newline name of 260", 48, lines(std::string(260, 'n') + "\n")},
-      {"BIG offsets going back", 52, B().bytes(rows[3].bytes).patch32(76, 98).get()},
+      {"newline name without its newline", 48, Cat({Slice(rows[2].bytes, 0, 96), Bytes(8)})},
+      {"newline name of 260", 48, Cat({Slice(rows[2].bytes, 0, 91), Bytes(260, 'n'), Text("\n")})},
+      {"BIG offsets going back", 52, With(rows[3], 76, 98)},
   });
 }
 

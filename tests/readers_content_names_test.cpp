@@ -1,9 +1,5 @@
-// Samples and refusals of the directories named by content or type: the
-// sheet archive (80), 8.3 names (88), the sound banks (102, 126), the raw
-// picture list (104), scrambled names (106), the chunk stream (146) and the
-// name list (156); and of the nested folders (150), the compressed trailing
-// directory (142), the image bank (115) and the pictures whose entry comes
-// from their header (78, 79).
+// Samples and refusals of the directories named by content or type, and of
+// the readers whose entries come from their header.
 #include <gtest/gtest.h>
 
 #include <tuple>
@@ -19,8 +15,7 @@ using B = ArchiveBuilder;
 
 const Bytes kSheet = B().u32(~0u).u32(0).u32(32).fill(8).u32(2).fill(80).get();
 
-// A record of the scrambled directory: each name byte k of entry i is XORed
-// with (N mod 5) + 2 (k + N) + i.
+// A scrambled record: name byte k of entry i XORed with (N mod 5) + 2 (k + N) + i.
 B& Scrambled(B& b, std::string_view name, uint32_t i, uint32_t at, uint32_t size, uint32_t packed) {
   const auto n = uint32_t(name.size());
   b.u32(n);

@@ -1,6 +1,5 @@
-// Samples and refusals of the readers that walk chunks, sections and trees:
-// "TR4" (39), "SNOK" (46), "PALETTEFILES " (49), the "TEX" texture lists (71,
-// 72), "_ARCHIVE" (53), "RezMgr" (54) and the item-stream tree archive (58).
+// Samples and refusals of the chunk, section and tree walks: "TR4", "SNOK",
+// "PALETTEFILES ", "TEX", "_ARCHIVE", "RezMgr" and the item-stream tree.
 #include <gtest/gtest.h>
 
 #include <array>
@@ -25,8 +24,7 @@ Bytes Snok(uint32_t count, const Bytes& data, const Bytes& records) {
 }
 
 CAIRN_SAMPLES(SectionSamples) {
-  // Three compressed atlases, each after its TGA copy (256 x 1, 1 and 2), a
-  // stored chunk with its 4 extra bytes and a chunk whose sizes differ.
+  // After the three atlases, a stored chunk (4 bytes follow) and one whose sizes differ.
   Sample tr4{"TR4", 39, "level.tr4"};
   ArchiveBuilder w;
   w.text("TR4").fill(7);
@@ -44,8 +42,7 @@ CAIRN_SAMPLES(SectionSamples) {
   const uint32_t o = w.size() + 8;
   tr4.bytes = w.u32(5).u32(5).bytes(Pattern(5)).u32(~0u).u32(0).u32(60).bytes(Pattern(60)).get();
   tr4 = Row(tr4, {{"level.tr4.000003", o, Pattern(5)}, {"level.tr4.000004", o + 17, Pattern(60)}});
-  // Entries are inflated whatever their sizes; the directory holds a '/'. A
-  // count of 0 takes a directory that inflates to nothing.
+  // Entries are inflated whatever their sizes; the directory holds a '/'.
   const Bytes a = Pattern(300, 6), za = Compress(a), zb = Compress(Text("hi"));
   const uint32_t zas = uint32_t(za.size()), zbs = uint32_t(zb.size());
   ArchiveBuilder dir;
@@ -53,15 +50,13 @@ CAIRN_SAMPLES(SectionSamples) {
   Sample snok{"SNOK", 46, "game.dat", Snok(2, Cat({za, zb}), dir.fill(8).get())};
   snok.listing = {{"maps\\one.dat", 276, 300, zas, 0, 0}, {"readme.txt", 276 + zas, 2, zbs, 0, 0}};
   snok.data = {a, Text("hi")};
-  // An empty section, name-only items, blanks before a count, and a last
-  // header closer to the end than a header's window.
+  // An empty section, name-only items, blanks before a count, a last header inside the window.
   const Bytes b = Pattern(8, 1), c = Pattern(4, 2), d = Pattern(60, 3);
   ArchiveBuilder pal;
   Z(Z(Z(pal, {"PALETTEFILES 2", "sky.pal"}).u32(8).bytes(b), {"sea.pal"}).u32(4).bytes(c),
     {"EMPTY 0", "SOUNDS 2", "boom.wav", "hiss.wav", "TEXTURES  1", "wall/brick"});
   Z(pal.u32(60).bytes(d), {"MATERIALS_X 1", "stone"});
-  // An empty texture, one followed by 5464 bytes, one with a 12-byte header
-  // extension; and a file of one texture.
+  // An empty texture, one followed by 5464 bytes, one with a 12-byte header extension.
   const Bytes p = Pattern(24, 4), q = Pattern(8, 5), r = Pattern(16, 6);
   ArchiveBuilder tex1, tex2;
   tex1.text("TEX").u8(0).u32(1).u32(0x80u << 24).u32(3).fill(8).u32(0x08000000).fill(12);
@@ -76,7 +71,6 @@ CAIRN_SAMPLES(SectionSamples) {
   Sample one{"TEX single", 72, "one.tex", tex2.get()};
   one.listing = {{"one.tex.000000.tga", 24, 34, 16, 4 | 1 << 16, 0x20}};
   one.data = {tga(4 | 1 << 16, r)};
-  const Sample none{"SNOK of no entries", 46, "none.dat", Snok(0, Pattern(80), {})};
   const Sample sections =
       Row({"PALETTEFILES", 49, "game.pal", pal.get()}, {{"PALETTEFILES\\sky.pal", 27, b},
                                                         {"PALETTEFILES\\sea.pal", 47, c},
@@ -84,22 +78,8 @@ CAIRN_SAMPLES(SectionSamples) {
                                                         {"SOUNDS\\hiss.wav", 86, {}},
                                                         {"TEXTURES\\wall\\brick", 113, d},
                                                         {"MATERIALS_X\\stone", 193, {}}});
+  const Sample none{"SNOK of no entries", 46, "none.dat", Snok(0, Pattern(80), {})};
   return {tr4, snok, none, sections, list, one};
-}
-
-// Directories not of their count, headers without a count, textures past the end or too wide.
-TEST(ChunksAndSections, RefusesWhatTheWalksCannotHold) {
-  const Bytes record = ArchiveBuilder().name("a", 1024).u32(1).u32(1).fill(8).get();
-  const SampleTable rows = SectionSamples();
-  ArchiveBuilder noSpace;
-  Z(noSpace, {"PALETTEFILES"}).fill(100);
-  ExpectRefused({
-      {"SNOK directory of more records", 46, Snok(1, Pattern(80), Cat({record, record}))},
-      {"SNOK directory of fewer records", 46, Snok(3, Pattern(80), Cat({record, record}))},
-      {"PALETTEFILES header without a space", 49, noSpace.get()},
-      {"TEX header past the end", 71, ArchiveBuilder().bytes(rows[4].bytes).patch32(12, 4).get()},
-      {"TEX too wide", 72, ArchiveBuilder().bytes(rows[5].bytes).patch32(16, 1 << 16).get()},
-  });
 }
 
 // "_ARCHIVE" of folder records (name, child folders [a, b), files [g, h)) over
@@ -124,9 +104,8 @@ ArchiveBuilder& Item(ArchiveBuilder& w, std::string_view name, bool folder, uint
 const std::string kMudge = "MUDGE4.008/27/2000Copyright by Witan Entertainment B.V.";
 
 CAIRN_SAMPLES(NestedTreeSamples) {
-  // The root "data" holds "maps" (files) and "empty" (an empty range of
-  // folders: its files are not listed). A child range ends below the folder
-  // count, so the last folder is never a child.
+  // "data" holds "maps" and "empty", whose empty folder range hides its files;
+  // the last folder is never a child.
   const Bytes a = Pattern(10, 1), z = Compress(Pattern(200, 2));
   const uint32_t zs = uint32_t(z.size());
   Sample tables{"_ARCHIVE", 53, "game.arc",
@@ -134,8 +113,7 @@ CAIRN_SAMPLES(NestedTreeSamples) {
   tables.listing = {{"data\\maps\\a.bin", 318, 10, 10, 0, 0},
                     {"data\\maps\\b.z", 328, 200, zs, 0, 1}};
   tables.data = {a, Pattern(200, 2)};
-  // Records of kind, position, size and name; a file's type is stored back to
-  // front; "noteQ" has a type whose second byte is zero.
+  // A file's type is stored back to front; "noteQ" has a type whose second byte is zero.
   const Bytes b = Pattern(12, 4), c = Pattern(7, 5), d = Pattern(5, 6);
   ArchiveBuilder rez;
   rez.text("\r\nRezMgr").padTo(131).u32(163).u32(91).bytes(b).bytes(c).bytes(d);
@@ -162,17 +140,23 @@ CAIRN_SAMPLES(NestedTreeSamples) {
           items};
 }
 
-// Trees that loop, reach a file twice or nest 64 deep are refused.
-TEST(NestedTrees, RefusesLoopsAndRunawayTrees) {
-  ArchiveBuilder deep;
+TEST(Walks, RefusesWhatTheWalksCannotHold) {
+  const Bytes record = ArchiveBuilder().name("a", 1024).u32(1).u32(1).fill(8).get();
+  const SampleTable rows = SectionSamples();
+  ArchiveBuilder noSpace, deep;
+  Z(noSpace, {"PALETTEFILES"}).fill(100);
   deep.text(kMudge).u8(0).padTo(60).u32(64);
   for (int k = 0; k < 64; ++k) Item(deep, "", true, 1);
   ExpectRefused({
+      {"SNOK directory of more records", 46, Snok(1, Pattern(80), Cat({record, record}))},
+      {"SNOK directory of fewer records", 46, Snok(3, Pattern(80), Cat({record, record}))},
+      {"PALETTEFILES header without a space", 49, noSpace.get()},
+      {"TEX header past the end", 71, With(rows[4], 12, 4)},
+      {"TEX too wide", 72, With(rows[5], 16, 1 << 16)},
       {"_ARCHIVE folder inside itself", 53, Tables({{0, 0, 1, 0, 0}, {}}, Pattern(30), 10)},
       {"_ARCHIVE file listed twice", 53,
        Tables({{0, 1, 3, 0, 0}, {5, 9, 9, 0, 2}, {5, 9, 9, 1, 2}, {}}, Pattern(30), 10)},
-      {"RezMgr block leading back to the root", 54,
-       ArchiveBuilder().bytes(NestedTreeSamples()[1].bytes).patch32(203, 163).get()},
+      {"RezMgr block leading back to the root", 54, With(NestedTreeSamples()[1], 203, 163)},
       {"tree folders 64 deep", 58, Item(deep, "f", false, 0).get()},
   });
 }

@@ -6,6 +6,7 @@
 #include <filesystem>
 #include <map>
 #include <sstream>
+#include <tuple>
 
 #include "builder.h"
 #include "detect_fixtures.h"
@@ -217,6 +218,45 @@ TEST(Cli, ExtractNeverWritesOutsideTheFolderNorThroughLinks) {
   EXPECT_EQ(ReadFile(dir.path("outside.txt")), Text("keep me"));
 }
 
+// The first entry of a name keeps it; later ones are renamed, skipped or
+// replace it. Letter case tells names apart.
+TEST(Cli, ExtractKeepsRepeatedNamesApart) {
+  TempDir dir;
+  const std::string path = dir.write("maps.glb", Glb({{"a.txt", Text("1")},
+                                                      {"THINGS", Text("t1")},
+                                                      {"a.txt", Text("2")},
+                                                      {"THINGS", Text("t2")},
+                                                      {"THINGS", Text("t3")},
+                                                      {"a.TXT", Text("c")}}));
+  const std::vector<std::tuple<std::string, Files, std::string>> cases = {
+      {"rename",
+       {{"a.txt", Text("1")},
+        {"a_1.txt", Text("2")},
+        {"a.TXT", Text("c")},
+        {"THINGS", Text("t1")},
+        {"THINGS_1", Text("t2")},
+        {"THINGS_2", Text("t3")}},
+       "6 entries extracted to OUT, 3 renamed for a repeated name"},
+      {"skip",
+       {{"a.txt", Text("1")}, {"a.TXT", Text("c")}, {"THINGS", Text("t1")}},
+       "3 of 6 entries extracted to OUT, 3 skipped for a repeated name"},
+      {"overwrite",
+       {{"a.txt", Text("2")}, {"a.TXT", Text("c")}, {"THINGS", Text("t3")}},
+       "6 entries extracted to OUT, 3 replaced an entry of the same name"}};
+  for (const auto& [mode, files, summary] : cases) {
+    const ToolRun r = Cairn({"extract", path, "-o", "OUT", "--duplicates=" + mode}, dir.path(""));
+    EXPECT_EQ(r.status, 0) << r.err;
+    EXPECT_EQ(FilesBelow(dir.path("OUT")), files) << mode;
+    EXPECT_EQ(Lines(r.out).back(), summary);
+    fs::remove_all(dir.path("OUT"));
+  }
+  // Renames are shown; files from before the run stay protected.
+  EXPECT_NE(Cairn({"extract", path, "-o", "OUT"}, dir.path("")).out.find("a.txt as a_1.txt\n"),
+            std::string::npos);
+  EXPECT_EQ(Cairn({"extract", path, "-o", "OUT"}, dir.path("")).status, 3);
+  EXPECT_EQ(FilesBelow(dir.path("OUT")), std::get<1>(cases[0]));
+}
+
 // One file of every format that recognition can reach, each in a folder of
 // its own with its companions, and files that are no archive.
 TEST(Cli, DetectNamesEveryReachableFormatOrUnknown) {
@@ -277,7 +317,7 @@ TEST(Cli, UsageErrorsAndHelp) {
 }
 
 // Every sample lists and extracts through the tool as it does through the
-// core; entries of one name replace each other, the last one stays.
+// core; a repeated name gets a numbered copy.
 TEST(Cli, ReplaysEverySample) {
   for (const Sample& s : AllSamples()) {
     if (!s.recognised) continue;
@@ -290,13 +330,18 @@ TEST(Cli, ReplaysEverySample) {
       names.push_back(s.listing[i].name);
       std::string rel = s.listing[i].name;
       std::replace(rel.begin(), rel.end(), '\\', '/');
+      const std::string base = rel;
+      const size_t dot = base.rfind('.'), start = base.rfind('/') + 1;
+      const size_t at = dot == std::string::npos || dot <= start ? base.size() : dot;
+      for (int n = 1; expected.count(rel) > 0; ++n)
+        rel = base.substr(0, at) + "_" + std::to_string(n) + base.substr(at);
       expected[rel] = s.data[i];
     }
     const ToolRun list = Cairn({"list", path});
     ASSERT_EQ(list.status, 0) << list.err;
     for (const std::string& row : ListedRows(list.out)) listed.push_back(row.substr(20));
     EXPECT_EQ(listed, names);
-    const ToolRun extract = Cairn({"extract", "--overwrite", "-q", path, "-o", dir.path("out")});
+    const ToolRun extract = Cairn({"extract", "-q", path, "-o", dir.path("out")});
     EXPECT_EQ(extract.status, 0) << extract.err;
     EXPECT_EQ(FilesBelow(dir.path("out")), expected);
   }

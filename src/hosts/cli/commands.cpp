@@ -11,6 +11,7 @@
 #include <filesystem>
 #include <optional>
 #include <random>
+#include <set>
 #include <string_view>
 #include <system_error>
 
@@ -182,21 +183,55 @@ std::optional<fs::path> CreateScratch(const fs::path& folder) {
   return std::nullopt;
 }
 
-enum class Outcome { Done, Failed, Stopped };
+// The paths written so far in one run, as the file system compares them.
+class TakenPaths {
+ public:
+  bool has(const std::vector<std::string>& parts) const { return paths_.count(Key(parts)) > 0; }
+  void add(const std::vector<std::string>& parts) { paths_.insert(Key(parts)); }
+
+ private:
+  static std::string Key(const std::vector<std::string>& parts) {
+    std::string key;
+    for (const std::string& part : parts) key += part + '/';
+#ifdef _WIN32
+    for (char& c : key)
+      if (c >= 'A' && c <= 'Z') c = static_cast<char>(c - 'A' + 'a');
+#endif
+    return key;
+  }
+  std::set<std::string> paths_;
+};
+
+// "THINGS" -> "THINGS_2", "a.txt" -> "a_2.txt"; a leading dot starts no
+// extension.
+std::string Numbered(const std::string& name, unsigned n) {
+  const size_t dot = name.rfind('.');
+  const size_t at = dot == std::string::npos || dot == 0 ? name.size() : dot;
+  return fmt::format("{}_{}{}", name.substr(0, at), n, name.substr(at));
+}
+
+enum class Outcome { Done, Renamed, Replaced, Skipped, Failed, Stopped };
 
 // Writes entry `index` below `root`. The entry goes to a scratch file beside
 // its place first and is renamed over it only when complete, so that a
 // failed extraction leaves an existing file as it was.
 Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const ExtractOptions& o,
-                   std::string& shown) {
+                   TakenPaths& taken, std::string& shown) {
   const std::string name = s.entries[index].Name;
-  const RelativeName rel = SplitEntryName(name);
+  RelativeName rel = SplitEntryName(name);
   if (rel.parts.empty()) {
     Say(o.archive, name, "refused: " + rel.refusal);
     return Outcome::Failed;
   }
+  const bool repeated = taken.has(rel.parts);
+  if (repeated && o.duplicates == Duplicates::Skip) return Outcome::Skipped;
+  if (repeated && o.duplicates == Duplicates::Rename) {
+    const std::string last = rel.parts.back();
+    for (unsigned n = 1; taken.has(rel.parts); ++n) rel.parts.back() = Numbered(last, n);
+  }
+  const bool replace = o.overwrite || (repeated && o.duplicates == Duplicates::Overwrite);
   std::string why;
-  const std::optional<fs::path> target = PrepareTarget(root, rel.parts, o.overwrite, why);
+  const std::optional<fs::path> target = PrepareTarget(root, rel.parts, replace, why);
   if (!target) {
     Say(o.archive, name, why);
     return Outcome::Failed;
@@ -211,9 +246,11 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
   if (result == kOk) {
     fs::rename(*scratch, *target, ec);
     if (!ec) {
+      taken.add(rel.parts);
       shown.clear();
       for (const std::string& part : rel.parts) shown += (shown.empty() ? "" : "/") + part;
-      return Outcome::Done;
+      if (!repeated) return Outcome::Done;
+      return o.duplicates == Duplicates::Rename ? Outcome::Renamed : Outcome::Replaced;
     }
   }
   fs::remove(*scratch, ec);
@@ -279,17 +316,32 @@ int ExtractCommand(const ExtractOptions& o) {
 
   InterruptGuard guard;
   s.progress = [](const std::string&, uint32_t) { return gStopRequested ? 0 : 1; };
-  size_t done = 0, failed = 0;
+  TakenPaths taken;
+  size_t done = 0, failed = 0, renamed = 0, replaced = 0, skipped = 0;
   for (size_t index : chosen) {
     if (gStopRequested) {
       Say(o.archive, "stopped");
       return kExitStopped;
     }
     std::string shown;
-    switch (ExtractOne(s, index, root, o, shown)) {
+    switch (ExtractOne(s, index, root, o, taken, shown)) {
+      case Outcome::Replaced:
+        ++replaced;
+        [[fallthrough]];
       case Outcome::Done:
         ++done;
         if (!o.quiet) fmt::print("  extracted: {}\n", Printable(shown));
+        break;
+      case Outcome::Renamed:
+        ++done;
+        ++renamed;
+        if (!o.quiet)
+          fmt::print("  extracted: {} as {}\n", Printable(s.entries[index].Name), Printable(shown));
+        break;
+      case Outcome::Skipped:
+        ++skipped;
+        if (!o.quiet)
+          fmt::print("  skipped: {} (a repeated name)\n", Printable(s.entries[index].Name));
         break;
       case Outcome::Failed:
         ++failed;
@@ -299,12 +351,16 @@ int ExtractCommand(const ExtractOptions& o) {
     }
   }
   if (!o.quiet) {
-    if (failed == 0)
-      fmt::print("{} {} extracted to {}\n", done, done == 1 ? "entry" : "entries",
-                 Printable(o.outputDir));
-    else
-      fmt::print("{} of {} entries extracted to {}, {} failed\n", done, chosen.size(),
-                 Printable(o.outputDir), failed);
+    std::string summary = failed == 0 && skipped == 0
+                              ? fmt::format("{} {} extracted to {}", done,
+                                            done == 1 ? "entry" : "entries", Printable(o.outputDir))
+                              : fmt::format("{} of {} entries extracted to {}", done, chosen.size(),
+                                            Printable(o.outputDir));
+    if (failed > 0) summary += fmt::format(", {} failed", failed);
+    if (renamed > 0) summary += fmt::format(", {} renamed for a repeated name", renamed);
+    if (replaced > 0) summary += fmt::format(", {} replaced an entry of the same name", replaced);
+    if (skipped > 0) summary += fmt::format(", {} skipped for a repeated name", skipped);
+    fmt::print("{}\n", summary);
   }
   return failed > 0 || unmatched ? kExitPartial : kExitDone;
 }

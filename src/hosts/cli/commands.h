@@ -18,11 +18,17 @@ enum ExitStatus : int {
 
 int ListCommand(const std::string& archive);
 
+// What becomes of an entry whose output path an earlier entry of the same run
+// has written: it takes a numbered name (THINGS_1, a_1.txt), is left out, or
+// replaces the earlier one.
+enum class Duplicates { Rename, Skip, Overwrite };
+
 struct ExtractOptions {
   std::string archive;
   std::string outputDir = ".";
   std::vector<std::string> patterns;  // none: every entry
-  bool overwrite = false;
+  bool overwrite = false;             // replace files that existed before the run
+  Duplicates duplicates = Duplicates::Rename;
   bool quiet = false;
 };
 int ExtractCommand(const ExtractOptions& options);

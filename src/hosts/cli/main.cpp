@@ -48,7 +48,14 @@ int main(int argc, char** argv) {
                              "'/' or '\\' between folders; a folder selects what lies below it)");
   extractCommand->add_option("-o,--output", extract.outputDir,
                              "Folder to write into, made when missing (default: .)");
-  extractCommand->add_flag("--overwrite", extract.overwrite, "Replace files that already exist");
+  extractCommand->add_flag("--overwrite", extract.overwrite,
+                           "Replace files that existed before this run");
+  std::string duplicates = "rename";
+  extractCommand
+      ->add_option("--duplicates", duplicates,
+                   "An entry whose path an earlier entry took: rename (default; THINGS_1, "
+                   "a_1.txt), skip, or overwrite the earlier one")
+      ->check(CLI::IsMember({"rename", "skip", "overwrite"}));
   extractCommand->add_flag("-q,--quiet", extract.quiet, "Report problems only");
 
   std::vector<std::string> detectFiles;
@@ -71,7 +78,12 @@ int main(int argc, char** argv) {
 
   try {
     if (list->parsed()) return ListCommand(listArchive);
-    if (extractCommand->parsed()) return ExtractCommand(extract);
+    if (extractCommand->parsed()) {
+      extract.duplicates = duplicates == "skip"        ? Duplicates::Skip
+                           : duplicates == "overwrite" ? Duplicates::Overwrite
+                                                       : Duplicates::Rename;
+      return ExtractCommand(extract);
+    }
     if (detect->parsed()) return DetectCommand(detectFiles);
     if (formats->parsed()) return FormatsCommand();
   } catch (const std::exception& e) {

@@ -107,7 +107,7 @@ TEST(Cli, ListShowsSizesNamesAndTotal) {
   const Strings rows = ListedRows(r.out, &total);
   EXPECT_EQ(Strings(rows.begin(), rows.begin() + 3),
             (Strings{"       6         6  README.TXT", " 3000000   3000000  big.bin",
-                     "       1         1  docs\\a.txt"}));
+                     "       1         1  docs/a.txt"}));
   EXPECT_EQ(total, " 3000014   3000014  8 entries");
   ListedRows(Cairn({"list", dir.write("one.glb", Glb({{"E1M1", Text("abc")}}))}).out, &total);
   EXPECT_EQ(total, "       3         3  1 entry");
@@ -198,13 +198,13 @@ TEST(Cli, ExtractNeverWritesOutsideTheFolderNorThroughLinks) {
   EXPECT_EQ(r.status, 3);
   const std::string at = "cairn: " + path + ": ";
   EXPECT_EQ(r.errLines(),
-            (Strings{at + "..\\escape.txt: refused: name climbs out with \"..\"",
-                     at + "\\abs.txt: refused: absolute name",
-                     at + "C:\\drive.txt: refused: name with a drive letter",
-                     at + "ok\\..\\..\\up.txt: refused: name climbs out with \"..\"",
-                     at + ".\\.\\: refused: empty name",
-                     at + "a\\b.txt\\c: cannot create: \"a/b.txt\" is a file, not a folder",
-                     at + "linked\\in.txt: refused: \"linked\" in the output folder is a "
+            (Strings{at + "../escape.txt: refused: name climbs out with \"..\"",
+                     at + "/abs.txt: refused: absolute name",
+                     at + "C:/drive.txt: refused: name with a drive letter",
+                     at + "ok/../../up.txt: refused: name climbs out with \"..\"",
+                     at + "././: refused: empty name",
+                     at + "a/b.txt/c: cannot create: \"a/b.txt\" is a file, not a folder",
+                     at + "linked/in.txt: refused: \"linked\" in the output folder is a "
                           "symbolic link",
                      at + "target.txt: already exists (use --overwrite to replace it)"}));
   EXPECT_NE(r.out.find("2 of 10 entries extracted to " + out + ", 8 failed"), std::string::npos)
@@ -317,7 +317,7 @@ TEST(Cli, UsageErrorsAndHelp) {
 }
 
 // Every sample lists and extracts through the tool as it does through the
-// core; a repeated name gets a numbered copy.
+// core, with '/' between folders; a repeated name gets a numbered copy.
 TEST(Cli, ReplaysEverySample) {
   for (const Sample& s : AllSamples()) {
     if (!s.recognised) continue;
@@ -327,9 +327,9 @@ TEST(Cli, ReplaysEverySample) {
     Strings names, listed;
     Files expected;
     for (size_t i = 0; i < s.data.size(); ++i) {
-      names.push_back(s.listing[i].name);
       std::string rel = s.listing[i].name;
       std::replace(rel.begin(), rel.end(), '\\', '/');
+      names.push_back(rel);
       const std::string base = rel;
       const size_t dot = base.rfind('.'), start = base.rfind('/') + 1;
       const size_t at = dot == std::string::npos || dot <= start ? base.size() : dot;

@@ -53,7 +53,8 @@ def check(archive, host, plugin, cairn, out):
     assert [(n, s, s) for n, _, s in lumps] == [listed[i] for i in stored], "plug-in listing"
     rows = run(cairn, "list", archive)
     rules = [i for i, line in enumerate(rows) if line.startswith("--------")]
-    assert listed == [(r[20:], int(r[:8]), int(r[10:18])) for r in rows[rules[0] + 1:rules[1]]]
+    shown = [(n.replace("\\", "/"), u, p) for n, u, p in listed]  # the tool shows '/'
+    assert shown == [(r[20:], int(r[:8]), int(r[10:18])) for r in rows[rules[0] + 1:rules[1]]]
     for i, (name, offset, size) in zip(stored, lumps):
         with open(os.path.join(out, "0", str(i)), "rb") as f:
             assert f.read() == data[offset:offset + size], f"bytes of {name}"

@@ -32,7 +32,7 @@ void Say(std::string_view file, std::string_view reason) {
 }
 
 void Say(std::string_view file, std::string_view entry, std::string_view reason) {
-  fmt::print(stderr, "cairn: {}: {}: {}\n", Printable(file), Printable(entry), reason);
+  fmt::print(stderr, "cairn: {}: {}: {}\n", Printable(file), Shown(entry), reason);
 }
 
 // What recognition answers for the file at `path`: nothing when the file
@@ -149,7 +149,7 @@ std::optional<fs::path> PrepareTarget(const fs::path& root, const std::vector<st
       why = fmt::format("cannot create: \"{}\" is a file, not a folder", Printable(shown));
       return std::nullopt;
     }
-    shown += '/';
+    shown += kShownSeparator;
   }
   fs::path target = at / parts.back();
   std::error_code ec;
@@ -248,7 +248,8 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
     if (!ec) {
       taken.add(rel.parts);
       shown.clear();
-      for (const std::string& part : rel.parts) shown += (shown.empty() ? "" : "/") + part;
+      for (const std::string& part : rel.parts)
+        shown += (shown.empty() ? "" : std::string(1, kShownSeparator)) + part;
       if (!repeated) return Outcome::Done;
       return o.duplicates == Duplicates::Rename ? Outcome::Renamed : Outcome::Replaced;
     }
@@ -275,7 +276,7 @@ int ListCommand(const std::string& archive) {
   const std::string rule = fmt::format("{0:-<{1}}  {0:-<{1}}  ----\n", "", w);
   fmt::print("{:>{}}  {:>{}}  Name\n{}", "Size", w, "Packed", w, rule);
   for (const ArchiveEntry& e : s.entries)
-    fmt::print("{:>{}}  {:>{}}  {}\n", e.UnpackedSize, w, e.PackedSize, w, Printable(e.Name));
+    fmt::print("{:>{}}  {:>{}}  {}\n", e.UnpackedSize, w, e.PackedSize, w, Shown(e.Name));
   const size_t n = s.entries.size();
   fmt::print("{}{:>{}}  {:>{}}  {} {}\n", rule, unpacked, w, packed, w, n,
              n == 1 ? "entry" : "entries");
@@ -336,12 +337,11 @@ int ExtractCommand(const ExtractOptions& o) {
         ++done;
         ++renamed;
         if (!o.quiet)
-          fmt::print("  extracted: {} as {}\n", Printable(s.entries[index].Name), Printable(shown));
+          fmt::print("  extracted: {} as {}\n", Shown(s.entries[index].Name), Printable(shown));
         break;
       case Outcome::Skipped:
         ++skipped;
-        if (!o.quiet)
-          fmt::print("  skipped: {} (a repeated name)\n", Printable(s.entries[index].Name));
+        if (!o.quiet) fmt::print("  skipped: {} (a repeated name)\n", Shown(s.entries[index].Name));
         break;
       case Outcome::Failed:
         ++failed;

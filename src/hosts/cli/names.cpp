@@ -1,5 +1,6 @@
 #include "hosts/cli/names.h"
 
+#include <algorithm>
 #include <cstddef>
 
 namespace cairn::cli {
@@ -83,6 +84,12 @@ std::string Printable(std::string_view name) {
   std::string s(name);
   for (char& c : s)
     if (static_cast<unsigned char>(c) < 0x20 || c == 0x7F) c = '?';
+  return s;
+}
+
+std::string Shown(std::string_view entryName) {
+  std::string s = Printable(entryName);
+  std::replace(s.begin(), s.end(), '\\', kShownSeparator);
   return s;
 }
 

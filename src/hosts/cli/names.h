@@ -35,4 +35,15 @@ bool MatchesEntry(std::string_view pattern, std::string_view name);
 // archive cannot drive the terminal.
 std::string Printable(std::string_view name);
 
+// What the tool prints between folders: '\' on Windows, '/' elsewhere.
+#ifdef _WIN32
+inline constexpr char kShownSeparator = '\\';
+#else
+inline constexpr char kShownSeparator = '/';
+#endif
+
+// An entry name as the tool prints it: Printable, with its '\' separators
+// shown as kShownSeparator.
+std::string Shown(std::string_view entryName);
+
 }  // namespace cairn::cli

@@ -365,6 +365,95 @@ int ExtractCommand(const ExtractOptions& o) {
   return failed > 0 || unmatched ? kExitPartial : kExitDone;
 }
 
+namespace {
+
+enum class Tested { Good, Failed, Skipped, Stopped };
+
+// Decodes each entry of `path` into a scratch file in `scratchDir`, removed at
+// once. While walking a folder, a file that is no archive is passed over.
+Tested TestArchive(const std::string& path, bool walking, const fs::path& scratchDir) {
+  if (walking) {
+    const std::optional<FormatId> id = Recognise(path);
+    if (!id || *id == 0 || FindFormat(*id)->reader == nullptr) return Tested::Skipped;
+  }
+  ArchiveSession s;
+  if (!OpenOrSay(s, path)) return Tested::Failed;
+  s.progress = [](const std::string&, uint32_t) { return gStopRequested ? 0 : 1; };
+  size_t failed = 0;
+  for (size_t i = 0; i < s.entries.size(); ++i) {
+    const std::optional<fs::path> scratch = CreateScratch(scratchDir);
+    if (!scratch) {
+      Say(path, fmt::format("cannot create a scratch file in {}", scratchDir.string()));
+      return Tested::Failed;
+    }
+    const int result = gStopRequested ? kAborted : ExtractEntry(s, i, scratch->string());
+    std::error_code ec;
+    fs::remove(*scratch, ec);
+    if (result == kAborted) {
+      Say(path, "stopped");
+      return Tested::Stopped;
+    }
+    if (result != kOk) {
+      Say(path, s.entries[i].Name, ExtractFailure(result));
+      ++failed;
+    }
+  }
+  const size_t n = s.entries.size();
+  if (failed == 0)
+    fmt::print("{}: {} {} OK\n", Printable(path), n, n == 1 ? "entry" : "entries");
+  else
+    fmt::print("{}: {} of {} entries failed\n", Printable(path), failed, n);
+  return failed == 0 ? Tested::Good : Tested::Failed;
+}
+
+}  // namespace
+
+int TestCommand(const TestOptions& o) {
+  std::error_code ec;
+  const fs::path scratchDir = fs::temp_directory_path(ec);
+  if (ec) {
+    fmt::print(stderr, "cairn: no folder for scratch files\n");
+    return kExitFailed;
+  }
+  InterruptGuard guard;
+  bool failed = false;
+  for (const std::string& path : o.paths) {
+    std::vector<std::string> files;
+    bool walking = false;
+    if (fs::is_directory(path, ec)) {
+      if (!o.recursive) {
+        Say(path, "it is a folder (use -r to test the archives below it)");
+        failed = true;
+        continue;
+      }
+      walking = true;
+      for (auto it = fs::recursive_directory_iterator(
+               path, fs::directory_options::skip_permission_denied, ec);
+           !ec && it != fs::recursive_directory_iterator(); it.increment(ec))
+        if (it->is_regular_file(ec)) files.push_back(it->path().string());
+      if (ec) {
+        Say(path, "cannot read the folder");
+        failed = true;
+      }
+      std::sort(files.begin(), files.end());
+    } else {
+      files.push_back(path);
+    }
+    for (const std::string& file : files) {
+      switch (TestArchive(file, walking, scratchDir)) {
+        case Tested::Failed:
+          failed = true;
+          break;
+        case Tested::Stopped:
+          return kExitStopped;
+        default:
+          break;
+      }
+    }
+  }
+  return failed ? kExitPartial : kExitDone;
+}
+
 int DetectCommand(const std::vector<std::string>& files) {
   int status = kExitDone;
   for (const std::string& path : files) {

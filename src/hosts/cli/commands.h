@@ -1,4 +1,4 @@
-// The four commands of the `cairn` tool. Each prints its result on standard
+// The commands of the `cairn` tool. Each prints its result on standard
 // output, one line per problem on standard error ("cairn: FILE: reason"), and
 // answers the process exit status.
 #pragma once
@@ -12,7 +12,8 @@ enum ExitStatus : int {
   kExitDone = 0,
   kExitFailed = 1,     // an archive or file could not be opened, read or recognised
   kExitUsage = 2,      // the command line was not understood
-  kExitPartial = 3,    // some entries were not extracted, or a pattern matched nothing
+  kExitPartial = 3,    // some entries were not extracted or did not decode, or a pattern
+                       // matched nothing
   kExitStopped = 130,  // interrupted; the entry being written was removed
 };
 
@@ -32,6 +33,13 @@ struct ExtractOptions {
   bool quiet = false;
 };
 int ExtractCommand(const ExtractOptions& options);
+
+struct TestOptions {
+  std::vector<std::string> paths;
+  bool recursive = false;  // walk folders, passing over files that are no archive
+};
+// Decodes every entry of each archive and throws the bytes away.
+int TestCommand(const TestOptions& options);
 
 int DetectCommand(const std::vector<std::string>& files);
 

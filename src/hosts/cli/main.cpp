@@ -18,10 +18,11 @@ namespace {
 constexpr const char* kExitStatusHelp =
     "Exit status:\n"
     "  0    done\n"
-    "  1    an archive or file could not be opened, read or recognised\n"
+    "  1    an archive or file could not be opened, read or recognised (test: 3)\n"
     "  2    the command line was not understood\n"
     "  3    some entries were not extracted (refused, already present, damaged,\n"
-    "       not creatable), or a NAME matched no entry\n"
+    "       not creatable), or a NAME matched no entry; for test, an archive or\n"
+    "       an entry failed\n"
     "  130  interrupted; the entry being written was removed\n"
     "Problems are reported one per line on standard error: \"cairn: FILE: reason\".";
 
@@ -30,7 +31,7 @@ constexpr const char* kExitStatusHelp =
 int main(int argc, char** argv) {
   using namespace cairn::cli;
 
-  CLI::App app{"cairn lists and extracts the resource archives of old games.", "cairn"};
+  CLI::App app{"cairn lists, extracts and tests the resource archives of old games.", "cairn"};
   app.set_version_flag("--version", std::string("cairn ") + CAIRN_VERSION);
   app.require_subcommand(1);
   app.footer(kExitStatusHelp);
@@ -58,6 +59,13 @@ int main(int argc, char** argv) {
       ->check(CLI::IsMember({"rename", "skip", "overwrite"}));
   extractCommand->add_flag("-q,--quiet", extract.quiet, "Report problems only");
 
+  TestOptions test;
+  CLI::App* testCommand = app.add_subcommand(
+      "test", "Decode every entry of each archive without writing it; one line per archive");
+  testCommand->add_option("ARCHIVE", test.paths, "Archive files, or folders with -r")->required();
+  testCommand->add_flag("-r,--recursive", test.recursive,
+                        "Test the archives in folders and below, passing over other files");
+
   std::vector<std::string> detectFiles;
   CLI::App* detect = app.add_subcommand("detect", "Tell the format of each file, or \"unknown\"");
   detect->add_option("FILE", detectFiles, "Files to recognise")->required();
@@ -84,6 +92,7 @@ int main(int argc, char** argv) {
                                                        : Duplicates::Rename;
       return ExtractCommand(extract);
     }
+    if (testCommand->parsed()) return TestCommand(test);
     if (detect->parsed()) return DetectCommand(detectFiles);
     if (formats->parsed()) return FormatsCommand();
   } catch (const std::exception& e) {

@@ -251,6 +251,34 @@ TEST(Cli, ExtractKeepsRepeatedNamesApart) {
   EXPECT_EQ(written(), renamed);
 }
 
+// test decodes every entry and says which failed; -r passes over other files.
+TEST(Cli, TestDecodesEveryEntryAndWalksFolders) {
+  TempDir dir;
+  const std::string good = WriteGame(dir), sub = dir.path("sub");
+  Bytes bad = Glb({{"a.txt", Text("a")}, {"b\\c.txt", Text("c")}});
+  PutU32le(bad, 48, 5000);  // b\c.txt runs past the end
+  const std::string damaged = dir.write("sub/damaged.glb", bad), failed = damaged + ": 1 of 2 ";
+  const std::string again = dir.write("sub/deeper/again.glb", Glb({{"x", Text("x")}}));
+  dir.write("sub/deeper/notes.txt", kPlainText);
+  const Strings bcTxt = {"cairn: " + damaged + ": b/c.txt: damaged entry data"};
+  const std::vector<std::tuple<Strings, int, std::string, Strings>> cases = {
+      {{good}, 0, good + ": 8 entries OK\n", {}},
+      {{good, damaged}, 3, good + ": 8 entries OK\n" + failed + "entries failed\n", bcTxt},
+      {{"-r", sub}, 3, failed + "entries failed\n" + again + ": 1 entry OK\n", bcTxt},
+      {{sub},
+       3,
+       "",
+       {"cairn: " + sub + ": it is a folder (use -r to test the archives below it)"}}};
+  for (const auto& [args, status, out, err] : cases) {
+    Strings command = {"test"};
+    command.insert(command.end(), args.begin(), args.end());
+    const ToolRun r = Cairn(command);
+    EXPECT_EQ(r.status, status) << args.back();
+    EXPECT_EQ(r.out, out);
+    EXPECT_EQ(r.errLines(), err);
+  }
+}
+
 // One file of every format that recognition can reach, each in a folder of
 // its own with its companions, and files that are no archive.
 TEST(Cli, DetectNamesEveryReachableFormatOrUnknown) {

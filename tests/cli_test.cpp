@@ -217,6 +217,19 @@ TEST(Cli, ExtractNeverWritesOutsideTheFolderNorThroughLinks) {
   EXPECT_EQ(ReadFile(dir.path("outside.txt")), Text("keep me"));
 }
 
+TEST(Cli, ExtractNeverReplacesTheArchiveItself) {
+  TempDir dir;
+  const Bytes archive = Glb({{"self.glb", Text("entry")}});
+  const std::string path = dir.write("self.glb", archive);
+  for (const char* overwrite : {"-q", "--overwrite"}) {
+    const ToolRun r = Cairn({"extract", overwrite, path, "-o", dir.dir().string()});
+    EXPECT_EQ(r.status, 3);
+    EXPECT_EQ(r.errLines(), (Strings{"cairn: " + path + ": self.glb: refused: that is the "
+                                     "archive being read, or a file read with it"}));
+    EXPECT_EQ(ReadFile(path), archive);
+  }
+}
+
 // One file of every format that recognition can reach, each in a folder of
 // its own with its companions, and files that are no archive.
 TEST(Cli, DetectNamesEveryReachableFormatOrUnknown) {

@@ -7,6 +7,7 @@
 #include <sys/stat.h>
 
 #include <cstring>
+#include <filesystem>
 #include <functional>
 
 #include "builder.h"
@@ -216,6 +217,45 @@ TEST(PluginHost, TheCursorKeepsToTheHostsCalls) {
   EXPECT_EQ(p.ProcessFile(h2, PK_EXTRACT, nullptr, dest.data()), 0);  // the callback stayed
   EXPECT_EQ(ReadFile(dest), Pattern(5));
   EXPECT_EQ(p.CloseArchive(h2), 0);
+}
+
+// Opens `archive`, lists its first entry and extracts it to `dest`.
+int ExtractFirst(std::string archive, std::string dest) {
+  const Plugin& p = Loaded();
+  tOpenArchiveData od{};
+  od.ArcName = archive.data();
+  void* h = p.OpenArchive(&od);
+  if (h == nullptr) return -od.OpenResult;
+  tHeaderData hd{};
+  const int result =
+      p.ReadHeader(h, &hd) != 0 ? -1 : p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data());
+  p.CloseArchive(h);
+  return result;
+}
+
+// The archive and its companions are never a destination, by any name.
+TEST(PluginHost, NeverExtractsOntoTheArchiveOrAFileReadBesideIt) {
+  TempDir dir;
+  const Bytes two = Glb({{"A", Pattern(3)}, {"B", Pattern(4)}});
+  const std::string path = dir.write("two.glb", two);
+  std::filesystem::create_symlink(path, dir.path("link.glb"));
+  std::filesystem::create_hard_link(path, dir.path("hard.glb"));
+  for (const std::string& dest : {path, dir.path("./two.glb"), dir.path("link.glb"),
+                                  dir.path("hard.glb"), dir.path("sub/../two.glb")}) {
+    std::filesystem::create_directories(dir.path("sub"));
+    EXPECT_EQ(ExtractFirst(path, dest), 16) << dest;
+    EXPECT_EQ(ReadFile(path), two) << dest;
+  }
+  EXPECT_EQ(ExtractFirst(path, dir.path("copy")), 0);
+  for (const Sample& s : AllSamples()) {
+    if (!s.recognised || s.companions.empty() || s.data.empty()) continue;
+    TempDir d;
+    const std::string archive = WriteSample(s, d.dir());
+    for (const auto& [name, bytes] : s.companions) {
+      EXPECT_EQ(ExtractFirst(archive, d.path(name)), 16) << s.label;
+      EXPECT_EQ(ReadFile(d.path(name)), bytes) << s.label;
+    }
+  }
 }
 
 }  // namespace

@@ -170,6 +170,12 @@ std::array<int, 3> CompositeParts(uint8_t flag) {
   return {first, second, third};
 }
 
+bool IsArchiveFile(const ArchiveSession& s, const std::string& path) {
+  os::FileId id;
+  if (!os::IdentifyPath(path.c_str(), id)) return false;
+  return std::find(s.sources.begin(), s.sources.end(), id) != s.sources.end();
+}
+
 void ExtractionFrame::Report(uint32_t bytes) const {
   if (session.progress && session.progress(destName, bytes) == 0) throw Aborted{};
 }

@@ -31,6 +31,11 @@ struct ExtractionFrame {
   void WriteAt(ByteView bytes, uint32_t position) const;
 };
 
+// Whether `path` names the archive of the session or a file read beside it,
+// by whatever spelling or link: such a destination is refused before it is
+// opened for writing.
+bool IsArchiveFile(const ArchiveSession& s, const std::string& path);
+
 using MethodFn = void (*)(ExtractionFrame&);
 
 // Copies `size` stored bytes from `offset` to the output in chunks of at most

@@ -58,4 +58,16 @@ int64_t UnixTime(const FileTimes& times);
 
 bool Delete(const char* path);
 
+// What tells two names of one file apart from two files: device and inode on
+// POSIX, volume serial and file index on Win32.
+struct FileId {
+  uint64_t volume = 0;
+  uint64_t index = 0;
+  bool operator==(const FileId&) const = default;
+};
+// The identity of an open file, or of the file at `path` (links followed);
+// false when there is none, e.g. nothing exists at the path.
+bool IdentifyFile(Handle h, FileId& id);
+bool IdentifyPath(const char* path, FileId& id);
+
 }  // namespace cairn::os

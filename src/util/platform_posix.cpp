@@ -130,6 +130,20 @@ int64_t UnixTime(const FileTimes& times) {
   return static_cast<int64_t>(times.write / 1000000000u);
 }
 
+bool IdentifyFile(Handle h, FileId& id) {
+  struct stat st {};
+  if (::fstat(Fd(h), &st) != 0) return false;
+  id = {static_cast<uint64_t>(st.st_dev), static_cast<uint64_t>(st.st_ino)};
+  return true;
+}
+
+bool IdentifyPath(const char* path, FileId& id) {
+  struct stat st {};
+  if (path == nullptr || *path == 0 || ::stat(path, &st) != 0) return false;
+  id = {static_cast<uint64_t>(st.st_dev), static_cast<uint64_t>(st.st_ino)};
+  return true;
+}
+
 bool Delete(const char* path) {
   return path != nullptr && ::unlink(path) == 0;
 }

@@ -124,8 +124,9 @@ struct InterruptGuard {
 // Makes the folders of `parts` below `root` and answers the path of the file
 // itself. Nothing is created through a symbolic link below the root: an entry
 // whose way down meets one is refused.
-std::optional<fs::path> PrepareTarget(const fs::path& root, const std::vector<std::string>& parts,
-                                      bool overwrite, std::string& why) {
+std::optional<fs::path> PrepareTarget(const ArchiveSession& s, const fs::path& root,
+                                      const std::vector<std::string>& parts, bool overwrite,
+                                      std::string& why) {
   fs::path at = root;
   std::string shown;
   for (size_t i = 0; i + 1 < parts.size(); ++i) {
@@ -152,6 +153,12 @@ std::optional<fs::path> PrepareTarget(const fs::path& root, const std::vector<st
   }
   fs::path target = at / parts.back();
   std::error_code ec;
+  // Renaming the finished entry over the archive, or over a file it is read
+  // with, would lose it, whatever --overwrite says.
+  if (IsArchiveFile(s, target.string())) {
+    why = "refused: that is the archive being read, or a file read with it";
+    return std::nullopt;
+  }
   const fs::file_status st = fs::symlink_status(target, ec);
   if (fs::exists(st) || fs::is_symlink(st)) {
     if (fs::is_directory(st)) {
@@ -196,7 +203,7 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
     return Outcome::Failed;
   }
   std::string why;
-  const std::optional<fs::path> target = PrepareTarget(root, rel.parts, o.overwrite, why);
+  const std::optional<fs::path> target = PrepareTarget(s, root, rel.parts, o.overwrite, why);
   if (!target) {
     Say(o.archive, name, why);
     return Outcome::Failed;

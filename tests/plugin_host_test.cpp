@@ -4,7 +4,12 @@
 // until the end, CloseArchive.
 #include <dlfcn.h>
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <csignal>
 
 #include <cstring>
 #include <filesystem>
@@ -256,6 +261,26 @@ TEST(PluginHost, NeverExtractsOntoTheArchiveOrAFileReadBesideIt) {
       EXPECT_EQ(ReadFile(d.path(name)), bytes) << s.label;
     }
   }
+}
+
+// A write the system refuses (here a file size limit, as a full disk would)
+// is 19, not damaged data, and leaves no output.
+TEST(PluginHost, AnOutputThatCannotBeWrittenIsAWriteFailure) {
+  TempDir dir;
+  const std::string path = dir.write("big.glb", Glb({{"A", Pattern(100000)}}));
+  const std::string dest = dir.path("out");
+  const pid_t child = fork();
+  if (child == 0) {
+    signal(SIGXFSZ, SIG_IGN);
+    const rlimit limit{4096, 4096};
+    setrlimit(RLIMIT_FSIZE, &limit);
+    _exit(ExtractFirst(path, dest));
+  }
+  int status = 0;
+  ASSERT_EQ(waitpid(child, &status, 0), child);
+  EXPECT_TRUE(WIFEXITED(status));
+  EXPECT_EQ(WEXITSTATUS(status), 19);
+  EXPECT_FALSE(Exists(dest));
 }
 
 }  // namespace

@@ -181,15 +181,14 @@ void ExtractionFrame::Report(uint32_t bytes) const {
 }
 
 void ExtractionFrame::Write(ByteView bytes) const {
-  if (bytes.size() > UINT32_MAX ||
-      !WriteExact(output, bytes.data(), static_cast<uint32_t>(bytes.size())))
-    throw BadData("write failed");
+  if (bytes.size() > UINT32_MAX) throw BadData("output too large");
+  if (!WriteExact(output, bytes.data(), static_cast<uint32_t>(bytes.size())))
+    throw WriteFailed{os::LastError()};
 }
 
 void ExtractionFrame::WriteAt(ByteView bytes, uint32_t position) const {
-  if (bytes.size() > UINT32_MAX ||
-      !cairn::WriteAt(output, bytes.data(), position, static_cast<uint32_t>(bytes.size())))
-    throw BadData("write failed");
+  if (!SeekTo(output, position)) throw BadData("output position out of reach");
+  Write(bytes);
 }
 
 void CopyStored(ExtractionFrame& f, uint32_t offset, uint32_t size) {

@@ -14,6 +14,13 @@ namespace cairn {
 // Thrown when the progress callback asks to stop.
 struct Aborted {};
 
+// Thrown when the output takes fewer bytes than it was given: the disk is
+// full, a quota or size limit was met, the device failed. `error` is the
+// system's code for it (os::LastError).
+struct WriteFailed {
+  int error;
+};
+
 struct ExtractionFrame {
   ArchiveSession& session;
   const ArchiveEntry& entry;
@@ -26,7 +33,8 @@ struct ExtractionFrame {
 
   // Tells the host that `bytes` more are done; throws Aborted on a 0 answer.
   void Report(uint32_t bytes) const;
-  // Writes at the output's current position; throws BadData on a short write.
+  // Writes at the output's current position; throws WriteFailed on a short
+  // write.
   void Write(ByteView bytes) const;
   void WriteAt(ByteView bytes, uint32_t position) const;
 };

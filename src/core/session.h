@@ -25,6 +25,7 @@ enum ResultCode : int {
   kOpenFailed = 15,
   kCreateFailed = 16,
   kReadFailed = 18,
+  kWriteFailed = 19,
   kAborted = 21,
 };
 

@@ -84,7 +84,8 @@ int OpenArchiveAs(ArchiveSession& s, const std::string& path, FormatId format) {
   return kBadData;
 }
 
-int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName) {
+int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName,
+                 int* writeError) {
   if (index >= s.entries.size() || !s.archive) return kBadData;
   if (IsArchiveFile(s, destName)) return kCreateFailed;
   File output(os::CreateAlways(destName.c_str()));
@@ -101,6 +102,9 @@ int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName) {
     os::SetTimes(output.get(), s.times);
   } catch (const Aborted&) {
     result = kAborted;
+  } catch (const WriteFailed& w) {
+    if (writeError != nullptr) *writeError = w.error;
+    result = kWriteFailed;
   } catch (const std::exception&) {
     result = kBadData;
   }

@@ -41,6 +41,11 @@ Handle CreateAlways(const char* path);
 Handle OpenExisting(const char* path);
 void Close(Handle h);
 
+// The system's code for why the last call of this thread failed (errno,
+// GetLastError), and the system's words for a code.
+int LastError();
+std::string ErrorText(int code);
+
 // Moves to an absolute position; positions beyond 2^31 - 1 cannot be reached.
 bool Seek(Handle h, uint32_t position);
 // Transfer at the current position; the result is the number of bytes moved.

@@ -94,8 +94,25 @@ uint32_t Read(Handle h, void* buffer, uint32_t count) {
 
 uint32_t Write(Handle h, const void* buffer, uint32_t count) {
   DWORD put = 0;
-  WriteFile(H(h), buffer, count, &put, nullptr);
+  if (WriteFile(H(h), buffer, count, &put, nullptr) != 0 && put < count)
+    SetLastError(ERROR_DISK_FULL);
   return put;
+}
+
+int LastError() {
+  return static_cast<int>(GetLastError());
+}
+
+std::string ErrorText(int code) {
+  char* text = nullptr;
+  const DWORD n = FormatMessageA(
+      FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS,
+      nullptr, static_cast<DWORD>(code), 0, reinterpret_cast<char*>(&text), 0, nullptr);
+  std::string words = n != 0 && text != nullptr ? std::string(text, n) : std::string();
+  LocalFree(text);
+  while (!words.empty() && (words.back() == '\n' || words.back() == '\r' || words.back() == '.'))
+    words.pop_back();
+  return words.empty() ? "system error " + std::to_string(code) : words;
 }
 
 uint32_t SizeLow(Handle h) {

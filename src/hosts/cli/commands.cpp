@@ -189,7 +189,9 @@ std::optional<fs::path> CreateScratch(const fs::path& folder) {
   return std::nullopt;
 }
 
-enum class Outcome { Done, Failed, Stopped };
+// Failed: this entry only. Full: the output cannot be written to, and the
+// entries after it would fail the same way.
+enum class Outcome { Done, Failed, Full, Stopped };
 
 // Writes entry `index` below `root`. The entry goes to a scratch file beside
 // its place first and is renamed over it only when complete, so that a
@@ -213,7 +215,8 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
     Say(o.archive, name, "cannot create");
     return Outcome::Failed;
   }
-  const int result = ExtractEntry(s, index, scratch->string());
+  int writeError = 0;
+  const int result = ExtractEntry(s, index, scratch->string(), &writeError);
   std::error_code ec;
   if (result == kOk) {
     fs::rename(*scratch, *target, ec);
@@ -224,6 +227,10 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
     }
   }
   fs::remove(*scratch, ec);
+  if (result == kWriteFailed) {
+    Say(o.archive, name, "cannot write: " + os::ErrorText(writeError));
+    return Outcome::Full;
+  }
   Say(o.archive, name, result == kOk ? "cannot create" : ExtractFailure(result));
   return result == kAborted ? Outcome::Stopped : Outcome::Failed;
 }
@@ -301,6 +308,10 @@ int ExtractCommand(const ExtractOptions& o) {
       case Outcome::Failed:
         ++failed;
         break;
+      case Outcome::Full:
+        Say(o.archive, fmt::format("stopped: {} of {} entries extracted to {}", done,
+                                   chosen.size(), Printable(o.outputDir)));
+        return kExitPartial;
       case Outcome::Stopped:
         return kExitStopped;
     }

@@ -9,11 +9,13 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <csignal>
 
 #include <cstring>
 #include <filesystem>
 #include <functional>
+#include <thread>
 
 #include "builder.h"
 #include "hosts/wcx/wcx.h"
@@ -40,6 +42,7 @@ struct Plugin {
   CAIRN_EXPORT(SetProcessDataProc);
   CAIRN_EXPORT(CanYouHandleThisFile);
   CAIRN_EXPORT(GetPackerCaps);
+  CAIRN_EXPORT(GetBackgroundFlags);
 #undef CAIRN_EXPORT
 };
 
@@ -209,19 +212,72 @@ TEST(PluginHost, TheCursorKeepsToTheHostsCalls) {
   EXPECT_STREQ(hd.FileName, "B");
   EXPECT_EQ(p.ReadHeader(h, &hd), 10);
   EXPECT_EQ(p.ReadHeader(h, &hd), 10);
-  // A second archive opened before the first is closed: the first handle is
-  // good only for CloseArchive.
+  // A second archive opened before the first is closed: both work, and the
+  // callback set last serves the new one; a closed handle is good for nothing.
   std::string path2 = dir.write("one.glb", Glb({{"C", Pattern(5)}}));
   od.ArcName = path2.data();
   void* h2 = p.OpenArchive(&od);
   ASSERT_NE(h2, h);
-  EXPECT_EQ(p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data()), 12);
-  EXPECT_EQ(p.CloseArchive(h), 0);
+  EXPECT_EQ(p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data()), 0);
+  EXPECT_EQ(ReadFile(dest), Pattern(4));
   EXPECT_EQ(p.ReadHeader(h2, &hd), 0);
   EXPECT_STREQ(hd.FileName, "C");
-  EXPECT_EQ(p.ProcessFile(h2, PK_EXTRACT, nullptr, dest.data()), 0);  // the callback stayed
+  g_reports.clear();
+  EXPECT_EQ(p.ProcessFile(h2, PK_EXTRACT, nullptr, dest.data()), 0);
+  EXPECT_EQ(g_reports.size(), 2u);
   EXPECT_EQ(ReadFile(dest), Pattern(5));
+  EXPECT_EQ(p.CloseArchive(h), 0);
+  EXPECT_EQ(p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data()), 12);
+  EXPECT_EQ(p.ReadHeader(h, &hd), 10);
   EXPECT_EQ(p.CloseArchive(h2), 0);
+  EXPECT_EQ(p.GetBackgroundFlags(), 1);  // BACKGROUND_UNPACK
+}
+
+std::atomic<int> g_threadReports{0};
+int CountReport(char*, int) {
+  ++g_threadReports;
+  return 1;
+}
+
+// One host thread extracts every entry of one archive over and over while
+// another opens, lists and closes a second one: each handle has its own
+// session.
+TEST(PluginHost, TwoThreadsWorkOnTwoArchivesAtOnce) {
+  const Plugin& p = Loaded();
+  TempDir dir;
+  const std::vector<std::pair<std::string, Bytes>> files = {
+      {"A", Pattern(3000, 1)}, {"B", Pattern(70000, 2)}, {"C", Pattern(10, 3)}};
+  const std::string one = dir.write("one.glb", Glb(files));
+  const std::string two = dir.write("two.glb", Glb({{"X", Pattern(9)}, {"Y", Pattern(8)}}));
+  const auto walk = [&](std::string path, bool extract) {
+    tOpenArchiveData od{};
+    od.ArcName = path.data();
+    void* h = p.OpenArchive(&od);
+    if (h == nullptr) return -1;
+    p.SetProcessDataProc(h, CountReport);
+    tHeaderData hd{};
+    int n = 0, failures = 0;
+    for (; p.ReadHeader(h, &hd) == 0; ++n) {
+      std::string dest = dir.path("out-" + std::string(hd.FileName));
+      if (extract && (p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data()) != 0 ||
+                      ReadFile(dest) != files[static_cast<size_t>(n)].second))
+        ++failures;
+    }
+    p.CloseArchive(h);
+    return failures == 0 ? n : -1;
+  };
+  int extracted = 0, listed = 0;
+  std::thread extractor([&] {
+    for (int i = 0; i < 40; ++i) extracted += walk(one, true) == 3;
+  });
+  std::thread lister([&] {
+    for (int i = 0; i < 400; ++i) listed += walk(two, false) == 2;
+  });
+  extractor.join();
+  lister.join();
+  EXPECT_EQ(extracted, 40);
+  EXPECT_EQ(listed, 400);
+  EXPECT_EQ(g_threadReports, 40 * 6);
 }
 
 // Opens `archive`, lists its first entry and extracts it to `dest`.

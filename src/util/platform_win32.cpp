@@ -8,7 +8,8 @@
 namespace cairn::os {
 namespace {
 
-PathEncoding g_encoding = PathEncoding::Ansi;
+// Per thread: each call of the plug-in sets it for its own length.
+thread_local PathEncoding g_encoding = PathEncoding::Ansi;
 
 HANDLE H(Handle h) {
   return reinterpret_cast<HANDLE>(h);

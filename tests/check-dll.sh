@@ -4,7 +4,7 @@
 #   check-dll.sh OBJDUMP DLL
 set -euo pipefail
 objdump=$1; dll=$2
-expected="CanYouHandleThisFile CanYouHandleThisFileW CloseArchive GetPackerCaps OpenArchive OpenArchiveW ProcessFile ProcessFileW ReadHeader ReadHeaderEx ReadHeaderExW SetChangeVolProc SetProcessDataProc"
+expected="CanYouHandleThisFile CanYouHandleThisFileW CloseArchive GetBackgroundFlags GetPackerCaps OpenArchive OpenArchiveW ProcessFile ProcessFileW ReadHeader ReadHeaderEx ReadHeaderExW SetChangeVolProc SetProcessDataProc"
 exports=$("$objdump" -p "$dll" | sed -n '/\[Ordinal\/Name Pointer\] Table/,/^$/p' | awk '/\[/ && NR>1 {print $NF}' | sort | tr '\n' ' ' | sed 's/ $//')
 [ "$exports" = "$expected" ] || { echo "exports differ: $exports"; exit 1; }
 imports=$("$objdump" -p "$dll" | awk '/DLL Name:/ {print tolower($3)}' | sort -u | tr '\n' ' ' | sed 's/ $//')

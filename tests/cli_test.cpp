@@ -41,10 +41,12 @@ std::string Quoted(const std::string& s) {
   return q + "'";
 }
 
-// Runs the tool with `args`, no input, in `cwd` when given.
-ToolRun Cairn(const Strings& args, const std::string& cwd = "") {
+// Runs the tool with `args`, no input, in `cwd` when given, after the shell
+// commands `before`.
+ToolRun Cairn(const Strings& args, const std::string& cwd = "", const std::string& before = "") {
   TempDir io;
-  std::string command = (cwd.empty() ? "" : "cd " + Quoted(cwd) + " && ") + CAIRN_CLI_PATH;
+  std::string command =
+      (cwd.empty() ? "" : "cd " + Quoted(cwd) + " && ") + before + CAIRN_CLI_PATH;
   for (const std::string& a : args) command += " " + Quoted(a);
   command += " </dev/null >" + io.path("1") + " 2>" + io.path("2");
   const int status = std::system(command.c_str());
@@ -277,6 +279,34 @@ TEST(Cli, TestDecodesEveryEntryAndWalksFolders) {
     EXPECT_EQ(r.out, out);
     EXPECT_EQ(r.errLines(), err);
   }
+}
+
+TEST(Cli, ExtractNeverReplacesTheArchiveItself) {
+  TempDir dir;
+  const Bytes archive = Glb({{"self.glb", Text("entry")}});
+  const std::string path = dir.write("self.glb", archive);
+  for (const char* overwrite : {"-q", "--overwrite"}) {
+    const ToolRun r = Cairn({"extract", overwrite, path, "-o", dir.dir().string()});
+    EXPECT_EQ(r.status, 3);
+    EXPECT_EQ(r.errLines(), (Strings{"cairn: " + path + ": self.glb: refused: that is the "
+                                     "archive being read, or a file read with it"}));
+    EXPECT_EQ(ReadFile(path), archive);
+  }
+}
+
+// A file size limit stands in for a full disk: the tool names the system's
+// reason and goes no further.
+TEST(Cli, ExtractStopsAtTheFirstOutputThatCannotBeWritten) {
+  TempDir dir;
+  const std::string path =
+      dir.write("g.glb", Glb({{"a", Text("a")}, {"big", Pattern(200000)}, {"c", Text("c")}}));
+  const std::string out = dir.path("out");
+  const ToolRun r = Cairn({"extract", "-q", path, "-o", out}, "", "trap '' XFSZ; ulimit -f 64; ");
+  EXPECT_EQ(r.status, 3);
+  EXPECT_EQ(r.errLines(), (Strings{"cairn: " + path + ": big: cannot write: File too large",
+                                   "cairn: " + path + ": stopped: 1 of 3 entries extracted to " +
+                                       out}));
+  EXPECT_EQ(FilesBelow(out), (Files{{"a", Text("a")}}));
 }
 
 // One file of every format that recognition can reach, each in a folder of

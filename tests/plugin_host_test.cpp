@@ -4,10 +4,18 @@
 // until the end, CloseArchive.
 #include <dlfcn.h>
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <csignal>
 
 #include <cstring>
+#include <filesystem>
 #include <functional>
+#include <thread>
 
 #include "builder.h"
 #include "hosts/wcx/wcx.h"
@@ -34,6 +42,7 @@ struct Plugin {
   CAIRN_EXPORT(SetProcessDataProc);
   CAIRN_EXPORT(CanYouHandleThisFile);
   CAIRN_EXPORT(GetPackerCaps);
+  CAIRN_EXPORT(GetBackgroundFlags);
 #undef CAIRN_EXPORT
 };
 
@@ -203,19 +212,131 @@ TEST(PluginHost, TheCursorKeepsToTheHostsCalls) {
   EXPECT_STREQ(hd.FileName, "B");
   EXPECT_EQ(p.ReadHeader(h, &hd), 10);
   EXPECT_EQ(p.ReadHeader(h, &hd), 10);
-  // A second archive opened before the first is closed: the first handle is
-  // good only for CloseArchive.
+  // A second archive opened before the first is closed: both work, and the
+  // callback set last serves the new one; a closed handle is good for nothing.
   std::string path2 = dir.write("one.glb", Glb({{"C", Pattern(5)}}));
   od.ArcName = path2.data();
   void* h2 = p.OpenArchive(&od);
   ASSERT_NE(h2, h);
-  EXPECT_EQ(p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data()), 12);
-  EXPECT_EQ(p.CloseArchive(h), 0);
+  EXPECT_EQ(p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data()), 0);
+  EXPECT_EQ(ReadFile(dest), Pattern(4));
   EXPECT_EQ(p.ReadHeader(h2, &hd), 0);
   EXPECT_STREQ(hd.FileName, "C");
-  EXPECT_EQ(p.ProcessFile(h2, PK_EXTRACT, nullptr, dest.data()), 0);  // the callback stayed
+  g_reports.clear();
+  EXPECT_EQ(p.ProcessFile(h2, PK_EXTRACT, nullptr, dest.data()), 0);
+  EXPECT_EQ(g_reports.size(), 2u);
   EXPECT_EQ(ReadFile(dest), Pattern(5));
+  EXPECT_EQ(p.CloseArchive(h), 0);
+  EXPECT_EQ(p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data()), 12);
+  EXPECT_EQ(p.ReadHeader(h, &hd), 10);
   EXPECT_EQ(p.CloseArchive(h2), 0);
+  EXPECT_EQ(p.GetBackgroundFlags(), 1);  // BACKGROUND_UNPACK
+}
+
+std::atomic<int> g_threadReports{0};
+int CountReport(char*, int) {
+  ++g_threadReports;
+  return 1;
+}
+
+// One host thread extracts every entry of one archive over and over while
+// another opens, lists and closes a second one: each handle has its own
+// session.
+TEST(PluginHost, TwoThreadsWorkOnTwoArchivesAtOnce) {
+  const Plugin& p = Loaded();
+  TempDir dir;
+  const std::vector<std::pair<std::string, Bytes>> files = {
+      {"A", Pattern(3000, 1)}, {"B", Pattern(70000, 2)}, {"C", Pattern(10, 3)}};
+  const std::string one = dir.write("one.glb", Glb(files));
+  const std::string two = dir.write("two.glb", Glb({{"X", Pattern(9)}, {"Y", Pattern(8)}}));
+  const auto walk = [&](std::string path, bool extract) {
+    tOpenArchiveData od{};
+    od.ArcName = path.data();
+    void* h = p.OpenArchive(&od);
+    if (h == nullptr) return -1;
+    p.SetProcessDataProc(h, CountReport);
+    tHeaderData hd{};
+    int n = 0, failures = 0;
+    for (; p.ReadHeader(h, &hd) == 0; ++n) {
+      std::string dest = dir.path("out-" + std::string(hd.FileName));
+      if (extract && (p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data()) != 0 ||
+                      ReadFile(dest) != files[static_cast<size_t>(n)].second))
+        ++failures;
+    }
+    p.CloseArchive(h);
+    return failures == 0 ? n : -1;
+  };
+  int extracted = 0, listed = 0;
+  std::thread extractor([&] {
+    for (int i = 0; i < 40; ++i) extracted += walk(one, true) == 3;
+  });
+  std::thread lister([&] {
+    for (int i = 0; i < 400; ++i) listed += walk(two, false) == 2;
+  });
+  extractor.join();
+  lister.join();
+  EXPECT_EQ(extracted, 40);
+  EXPECT_EQ(listed, 400);
+  EXPECT_EQ(g_threadReports, 40 * 6);
+}
+
+// Opens `archive`, lists its first entry and extracts it to `dest`.
+int ExtractFirst(std::string archive, std::string dest) {
+  const Plugin& p = Loaded();
+  tOpenArchiveData od{};
+  od.ArcName = archive.data();
+  void* h = p.OpenArchive(&od);
+  if (h == nullptr) return -od.OpenResult;
+  tHeaderData hd{};
+  const int result =
+      p.ReadHeader(h, &hd) != 0 ? -1 : p.ProcessFile(h, PK_EXTRACT, nullptr, dest.data());
+  p.CloseArchive(h);
+  return result;
+}
+
+// The archive and its companions are never a destination, by any name.
+TEST(PluginHost, NeverExtractsOntoTheArchiveOrAFileReadBesideIt) {
+  TempDir dir;
+  const Bytes two = Glb({{"A", Pattern(3)}, {"B", Pattern(4)}});
+  const std::string path = dir.write("two.glb", two);
+  std::filesystem::create_symlink(path, dir.path("link.glb"));
+  std::filesystem::create_hard_link(path, dir.path("hard.glb"));
+  for (const std::string& dest : {path, dir.path("./two.glb"), dir.path("link.glb"),
+                                  dir.path("hard.glb"), dir.path("sub/../two.glb")}) {
+    std::filesystem::create_directories(dir.path("sub"));
+    EXPECT_EQ(ExtractFirst(path, dest), 16) << dest;
+    EXPECT_EQ(ReadFile(path), two) << dest;
+  }
+  EXPECT_EQ(ExtractFirst(path, dir.path("copy")), 0);
+  for (const Sample& s : AllSamples()) {
+    if (!s.recognised || s.companions.empty() || s.data.empty()) continue;
+    TempDir d;
+    const std::string archive = WriteSample(s, d.dir());
+    for (const auto& [name, bytes] : s.companions) {
+      EXPECT_EQ(ExtractFirst(archive, d.path(name)), 16) << s.label;
+      EXPECT_EQ(ReadFile(d.path(name)), bytes) << s.label;
+    }
+  }
+}
+
+// A write the system refuses (here a file size limit, as a full disk would)
+// is 19, not damaged data, and leaves no output.
+TEST(PluginHost, AnOutputThatCannotBeWrittenIsAWriteFailure) {
+  TempDir dir;
+  const std::string path = dir.write("big.glb", Glb({{"A", Pattern(100000)}}));
+  const std::string dest = dir.path("out");
+  const pid_t child = fork();
+  if (child == 0) {
+    signal(SIGXFSZ, SIG_IGN);
+    const rlimit limit{4096, 4096};
+    setrlimit(RLIMIT_FSIZE, &limit);
+    _exit(ExtractFirst(path, dest));
+  }
+  int status = 0;
+  ASSERT_EQ(waitpid(child, &status, 0), child);
+  EXPECT_TRUE(WIFEXITED(status));
+  EXPECT_EQ(WEXITSTATUS(status), 19);
+  EXPECT_FALSE(Exists(dest));
 }
 
 }  // namespace

@@ -170,20 +170,25 @@ std::array<int, 3> CompositeParts(uint8_t flag) {
   return {first, second, third};
 }
 
+bool IsArchiveFile(const ArchiveSession& s, const std::string& path) {
+  os::FileId id;
+  if (!os::IdentifyPath(path.c_str(), id)) return false;
+  return std::find(s.sources.begin(), s.sources.end(), id) != s.sources.end();
+}
+
 void ExtractionFrame::Report(uint32_t bytes) const {
   if (session.progress && session.progress(destName, bytes) == 0) throw Aborted{};
 }
 
 void ExtractionFrame::Write(ByteView bytes) const {
-  if (bytes.size() > UINT32_MAX ||
-      !WriteExact(output, bytes.data(), static_cast<uint32_t>(bytes.size())))
-    throw BadData("write failed");
+  if (bytes.size() > UINT32_MAX) throw BadData("output too large");
+  if (!WriteExact(output, bytes.data(), static_cast<uint32_t>(bytes.size())))
+    throw WriteFailed{os::LastError()};
 }
 
 void ExtractionFrame::WriteAt(ByteView bytes, uint32_t position) const {
-  if (bytes.size() > UINT32_MAX ||
-      !cairn::WriteAt(output, bytes.data(), position, static_cast<uint32_t>(bytes.size())))
-    throw BadData("write failed");
+  if (!SeekTo(output, position)) throw BadData("output position out of reach");
+  Write(bytes);
 }
 
 void CopyStored(ExtractionFrame& f, uint32_t offset, uint32_t size) {

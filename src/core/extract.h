@@ -14,6 +14,13 @@ namespace cairn {
 // Thrown when the progress callback asks to stop.
 struct Aborted {};
 
+// Thrown when the output takes fewer bytes than it was given: the disk is
+// full, a quota or size limit was met, the device failed. `error` is the
+// system's code for it (os::LastError).
+struct WriteFailed {
+  int error;
+};
+
 struct ExtractionFrame {
   ArchiveSession& session;
   const ArchiveEntry& entry;
@@ -26,10 +33,16 @@ struct ExtractionFrame {
 
   // Tells the host that `bytes` more are done; throws Aborted on a 0 answer.
   void Report(uint32_t bytes) const;
-  // Writes at the output's current position; throws BadData on a short write.
+  // Writes at the output's current position; throws WriteFailed on a short
+  // write.
   void Write(ByteView bytes) const;
   void WriteAt(ByteView bytes, uint32_t position) const;
 };
+
+// Whether `path` names the archive of the session or a file read beside it,
+// by whatever spelling or link: such a destination is refused before it is
+// opened for writing.
+bool IsArchiveFile(const ArchiveSession& s, const std::string& path);
 
 using MethodFn = void (*)(ExtractionFrame&);
 

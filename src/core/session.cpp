@@ -24,6 +24,13 @@ std::vector<uint8_t> ReadBlock(const ReaderContext& c, uint64_t position, uint64
   return block;
 }
 
+File OpenBeside(const ReaderContext& c, const std::string& path) {
+  File f(path.empty() ? os::kNoFile : os::OpenShared(path.c_str()));
+  os::FileId id;
+  if (f && os::IdentifyFile(f.get(), id)) c.session.sources.push_back(id);
+  return f;
+}
+
 void SizesFromOffsets(ReaderContext& c, uint32_t end) {
   if (end == 0) end = c.fileSize;
   for (size_t i = c.entries.size(); i-- > 0;) {
@@ -37,6 +44,7 @@ void CloseArchiveSession(ArchiveSession& s) {
   s.entries.clear();
   s.entries.shrink_to_fit();
   s.archive.Close();
+  s.sources.clear();
   s.format = 0;
   s.readerFlag = 0;
 }

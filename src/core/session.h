@@ -25,6 +25,7 @@ enum ResultCode : int {
   kOpenFailed = 15,
   kCreateFailed = 16,
   kReadFailed = 18,
+  kWriteFailed = 19,
   kAborted = 21,
 };
 
@@ -52,6 +53,9 @@ struct ArchiveSession {
   os::FileTimes times;
   uint32_t dosTime = 0;
   ProgressFn progress;
+  // The archive and every file its reader opened beside it: extraction never
+  // writes onto one of them.
+  std::vector<os::FileId> sources;
   uint8_t readerFlag = 0;  // one byte of state for the readers that need it
 };
 
@@ -76,6 +80,10 @@ ArchiveEntry& AddEntry(ReaderContext& c, std::string_view name, uint32_t offset,
 // Reads `length` bytes at `position`; refuses with BadData a block that does
 // not lie inside the archive, before anything is allocated.
 std::vector<uint8_t> ReadBlock(const ReaderContext& c, uint64_t position, uint64_t length);
+
+// Opens a companion file beside the archive for reading and counts it among
+// the session's sources; an empty File when it cannot be opened.
+File OpenBeside(const ReaderContext& c, const std::string& path);
 
 // Sizes each entry as the distance to the next entry's offset, the last one
 // up to `end` (the file size when 0). Offsets must not go backwards.

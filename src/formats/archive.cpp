@@ -65,6 +65,9 @@ int OpenArchiveAs(ArchiveSession& s, const std::string& path, FormatId format) {
     const FormatInfo& info = *FindFormat(o.format);
     const uint32_t size = os::SizeLow(o.file.get());
     s.path = path;
+    os::FileId id;
+    if (!os::IdentifyFile(o.file.get(), id)) throw BadData("no file identity");
+    s.sources.push_back(id);
     ReaderContext c{s,      o.file.get(),         ByteView(o.header), size,
                     s.path, FileNamePart(s.path), s.entries};
     info.reader(c, info.row);
@@ -81,8 +84,10 @@ int OpenArchiveAs(ArchiveSession& s, const std::string& path, FormatId format) {
   return kBadData;
 }
 
-int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName) {
+int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName,
+                 int* writeError) {
   if (index >= s.entries.size() || !s.archive) return kBadData;
+  if (IsArchiveFile(s, destName)) return kCreateFailed;
   File output(os::CreateAlways(destName.c_str()));
   if (!output) return kCreateFailed;
   // A copy: a method may read other entries, but never changes the table.
@@ -97,6 +102,9 @@ int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName) {
     os::SetTimes(output.get(), s.times);
   } catch (const Aborted&) {
     result = kAborted;
+  } catch (const WriteFailed& w) {
+    if (writeError != nullptr) *writeError = w.error;
+    result = kWriteFailed;
   } catch (const std::exception&) {
     result = kBadData;
   }

@@ -23,8 +23,11 @@ int OpenArchiveAs(ArchiveSession& s, const std::string& path, FormatId format);
 // or 0 when the file is unknown or its format has no reader.
 FormatId RecogniseFile(const std::string& path);
 
-// Extracts entry `index` of the open session to `destName`. Answers 0, 12, 16
-// or 21; after anything but 0 no output is left behind.
-int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName);
+// Extracts entry `index` of the open session to `destName`. Answers 0, 12, 16,
+// 19 or 21; after anything but 0 no output is left behind. For 19 (the
+// output took fewer bytes than given) `writeError`, when given, receives the
+// system's code for the reason.
+int ExtractEntry(ArchiveSession& s, size_t index, const std::string& destName,
+                 int* writeError = nullptr);
 
 }  // namespace cairn

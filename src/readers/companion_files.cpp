@@ -44,7 +44,7 @@ void OffsetNameReader(ReaderContext& c, unsigned /*row*/) {
 
 void SectorDirectoryReader(ReaderContext& c, unsigned /*row*/) {
   constexpr uint64_t kSector = 2048;
-  const File companion(os::OpenShared(CompanionPath(c.path, ".dir").c_str()));
+  const File companion = OpenBeside(c, CompanionPath(c.path, ".dir"));
   if (!companion) throw BadData("no companion directory");
   const uint32_t size = os::SizeLow(companion.get());
   std::vector<uint8_t> bytes(size);

@@ -135,8 +135,7 @@ void RawPictureListReader(ReaderContext& c, unsigned) {
 
 void IndexedSoundBankReader(ReaderContext& c, unsigned) {
   // Without its index the bank lists nothing.
-  const std::string indexPath = CompanionPath(c.path, ".idx");
-  const File index(indexPath.empty() ? os::kNoFile : os::OpenShared(indexPath.c_str()));
+  const File index = OpenBeside(c, CompanionPath(c.path, ".idx"));
   if (!index) return;
   const uint32_t size = os::SizeLow(index.get());
   if (size < 12) throw BadData("index shorter than its header");

@@ -79,7 +79,7 @@ std::vector<uint8_t> ReadCompanion(const ReaderContext& c, std::string_view ext)
   if (dot == std::string_view::npos) throw BadData("no extension to replace");
   std::string path(c.path.substr(0, c.path.size() - c.archiveFileName.size() + dot));
   path += ext;
-  const File index(os::OpenShared(path.c_str()));
+  const File index = OpenBeside(c, path);
   if (!index) throw BadData("no index file");
   std::vector<uint8_t> bytes(os::SizeLow(index.get()));
   if (!ReadAt(index.get(), bytes.data(), 0, static_cast<uint32_t>(bytes.size())))

@@ -41,6 +41,11 @@ Handle CreateAlways(const char* path);
 Handle OpenExisting(const char* path);
 void Close(Handle h);
 
+// The system's code for why the last call of this thread failed (errno,
+// GetLastError), and the system's words for a code.
+int LastError();
+std::string ErrorText(int code);
+
 // Moves to an absolute position; positions beyond 2^31 - 1 cannot be reached.
 bool Seek(Handle h, uint32_t position);
 // Transfer at the current position; the result is the number of bytes moved.
@@ -57,5 +62,17 @@ uint32_t DosTime(const FileTimes& times);
 int64_t UnixTime(const FileTimes& times);
 
 bool Delete(const char* path);
+
+// What tells two names of one file apart from two files: device and inode on
+// POSIX, volume serial and file index on Win32.
+struct FileId {
+  uint64_t volume = 0;
+  uint64_t index = 0;
+  bool operator==(const FileId&) const = default;
+};
+// The identity of an open file, or of the file at `path` (links followed);
+// false when there is none, e.g. nothing exists at the path.
+bool IdentifyFile(Handle h, FileId& id);
+bool IdentifyPath(const char* path, FileId& id);
 
 }  // namespace cairn::os

@@ -6,6 +6,7 @@
 #include <cerrno>
 #include <climits>
 #include <ctime>
+#include <system_error>
 
 #include "util/platform.h"
 
@@ -62,6 +63,14 @@ void Close(Handle h) {
   if (h != kNoFile) ::close(Fd(h));
 }
 
+int LastError() {
+  return errno;
+}
+
+std::string ErrorText(int code) {
+  return std::system_category().message(code);
+}
+
 bool Seek(Handle h, uint32_t position) {
   if (position > static_cast<uint32_t>(INT32_MAX)) return false;
   return ::lseek(Fd(h), static_cast<off_t>(position), SEEK_SET) == static_cast<off_t>(position);
@@ -85,6 +94,7 @@ uint32_t Write(Handle h, const void* buffer, uint32_t count) {
   while (done < count) {
     ssize_t n = ::write(Fd(h), p + done, count - done);
     if (n < 0 && errno == EINTR) continue;
+    if (n == 0) errno = ENOSPC;  // a file that takes no more says nothing else
     if (n <= 0) break;
     done += static_cast<uint32_t>(n);
   }
@@ -128,6 +138,20 @@ uint32_t DosTime(const FileTimes& times) {
 
 int64_t UnixTime(const FileTimes& times) {
   return static_cast<int64_t>(times.write / 1000000000u);
+}
+
+bool IdentifyFile(Handle h, FileId& id) {
+  struct stat st {};
+  if (::fstat(Fd(h), &st) != 0) return false;
+  id = {static_cast<uint64_t>(st.st_dev), static_cast<uint64_t>(st.st_ino)};
+  return true;
+}
+
+bool IdentifyPath(const char* path, FileId& id) {
+  struct stat st {};
+  if (path == nullptr || *path == 0 || ::stat(path, &st) != 0) return false;
+  id = {static_cast<uint64_t>(st.st_dev), static_cast<uint64_t>(st.st_ino)};
+  return true;
 }
 
 bool Delete(const char* path) {

@@ -8,7 +8,8 @@
 namespace cairn::os {
 namespace {
 
-PathEncoding g_encoding = PathEncoding::Ansi;
+// Per thread: each call of the plug-in sets it for its own length.
+thread_local PathEncoding g_encoding = PathEncoding::Ansi;
 
 HANDLE H(Handle h) {
   return reinterpret_cast<HANDLE>(h);
@@ -94,8 +95,25 @@ uint32_t Read(Handle h, void* buffer, uint32_t count) {
 
 uint32_t Write(Handle h, const void* buffer, uint32_t count) {
   DWORD put = 0;
-  WriteFile(H(h), buffer, count, &put, nullptr);
+  if (WriteFile(H(h), buffer, count, &put, nullptr) != 0 && put < count)
+    SetLastError(ERROR_DISK_FULL);
   return put;
+}
+
+int LastError() {
+  return static_cast<int>(GetLastError());
+}
+
+std::string ErrorText(int code) {
+  char* text = nullptr;
+  const DWORD n = FormatMessageA(
+      FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS,
+      nullptr, static_cast<DWORD>(code), 0, reinterpret_cast<char*>(&text), 0, nullptr);
+  std::string words = n != 0 && text != nullptr ? std::string(text, n) : std::string();
+  LocalFree(text);
+  while (!words.empty() && (words.back() == '\n' || words.back() == '\r' || words.back() == '.'))
+    words.pop_back();
+  return words.empty() ? "system error " + std::to_string(code) : words;
 }
 
 uint32_t SizeLow(Handle h) {
@@ -143,6 +161,25 @@ uint32_t DosTime(const FileTimes& times) {
 
 int64_t UnixTime(const FileTimes& times) {
   return (static_cast<int64_t>(times.write) - 116444736000000000LL) / 10000000;
+}
+
+bool IdentifyFile(Handle h, FileId& id) {
+  BY_HANDLE_FILE_INFORMATION info{};
+  if (GetFileInformationByHandle(H(h), &info) == 0) return false;
+  id = {info.dwVolumeSerialNumber,
+        static_cast<uint64_t>(info.nFileIndexHigh) << 32 | info.nFileIndexLow};
+  return true;
+}
+
+bool IdentifyPath(const char* path, FileId& id) {
+  // No access asked and every sharing allowed: this opens whatever is open
+  // elsewhere, folders included, and changes nothing.
+  const Handle h = Open(path, 0, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE,
+                        OPEN_EXISTING, FILE_FLAG_BACKUP_SEMANTICS);
+  if (h == kNoFile) return false;
+  const bool known = IdentifyFile(h, id);
+  CloseHandle(H(h));
+  return known;
 }
 
 bool Delete(const char* path) {

@@ -125,8 +125,9 @@ struct InterruptGuard {
 // Makes the folders of `parts` below `root` and answers the path of the file
 // itself. Nothing is created through a symbolic link below the root: an entry
 // whose way down meets one is refused.
-std::optional<fs::path> PrepareTarget(const fs::path& root, const std::vector<std::string>& parts,
-                                      bool overwrite, std::string& why) {
+std::optional<fs::path> PrepareTarget(const ArchiveSession& s, const fs::path& root,
+                                      const std::vector<std::string>& parts, bool overwrite,
+                                      std::string& why) {
   fs::path at = root;
   std::string shown;
   for (size_t i = 0; i + 1 < parts.size(); ++i) {
@@ -153,6 +154,12 @@ std::optional<fs::path> PrepareTarget(const fs::path& root, const std::vector<st
   }
   fs::path target = at / parts.back();
   std::error_code ec;
+  // Renaming the finished entry over the archive, or over a file it is read
+  // with, would lose it, whatever --overwrite says.
+  if (IsArchiveFile(s, target.string())) {
+    why = "refused: that is the archive being read, or a file read with it";
+    return std::nullopt;
+  }
   const fs::file_status st = fs::symlink_status(target, ec);
   if (fs::exists(st) || fs::is_symlink(st)) {
     if (fs::is_directory(st)) {
@@ -210,7 +217,9 @@ std::string Numbered(const std::string& name, unsigned n) {
   return fmt::format("{}_{}{}", name.substr(0, at), n, name.substr(at));
 }
 
-enum class Outcome { Done, Renamed, Replaced, Skipped, Failed, Stopped };
+// Failed: this entry only. Full: the output cannot be written to, and the
+// entries after it would fail the same way.
+enum class Outcome { Done, Renamed, Replaced, Skipped, Failed, Full, Stopped };
 
 // Writes entry `index` below `root`. The entry goes to a scratch file beside
 // its place first and is renamed over it only when complete, so that a
@@ -231,7 +240,7 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
   }
   const bool replace = o.overwrite || (repeated && o.duplicates == Duplicates::Overwrite);
   std::string why;
-  const std::optional<fs::path> target = PrepareTarget(root, rel.parts, replace, why);
+  const std::optional<fs::path> target = PrepareTarget(s, root, rel.parts, replace, why);
   if (!target) {
     Say(o.archive, name, why);
     return Outcome::Failed;
@@ -241,7 +250,8 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
     Say(o.archive, name, "cannot create");
     return Outcome::Failed;
   }
-  const int result = ExtractEntry(s, index, scratch->string());
+  int writeError = 0;
+  const int result = ExtractEntry(s, index, scratch->string(), &writeError);
   std::error_code ec;
   if (result == kOk) {
     fs::rename(*scratch, *target, ec);
@@ -255,6 +265,10 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
     }
   }
   fs::remove(*scratch, ec);
+  if (result == kWriteFailed) {
+    Say(o.archive, name, "cannot write: " + os::ErrorText(writeError));
+    return Outcome::Full;
+  }
   Say(o.archive, name, result == kOk ? "cannot create" : ExtractFailure(result));
   return result == kAborted ? Outcome::Stopped : Outcome::Failed;
 }
@@ -346,6 +360,10 @@ int ExtractCommand(const ExtractOptions& o) {
       case Outcome::Failed:
         ++failed;
         break;
+      case Outcome::Full:
+        Say(o.archive, fmt::format("stopped: {} of {} entries extracted to {}", done,
+                                   chosen.size(), Printable(o.outputDir)));
+        return kExitPartial;
       case Outcome::Stopped:
         return kExitStopped;
     }

@@ -1,13 +1,17 @@
-// The WCX exports: the one process-wide session the host contract describes,
-// walked by the host's cursor. ProcessFile works on the entry the last
-// ReadHeader returned and never moves the cursor, so a host that extracts
-// while it walks meets every entry exactly once.
+// The WCX exports. Every open archive has a session of its own, found by the
+// handle the host holds; file managers call from worker threads, so each
+// archive's calls run under its own lock and the table's lock is held only
+// to find one. ProcessFile works on the entry the last ReadHeader returned
+// and never moves the cursor, so a host that extracts while it walks meets
+// every entry exactly once.
 #include "hosts/wcx/wcx.h"
 
 #include <algorithm>
 #include <cstring>
 #include <exception>
-#include <list>
+#include <map>
+#include <memory>
+#include <mutex>
 #include <optional>
 #include <string>
 #include <utility>
@@ -20,21 +24,35 @@ namespace {
 
 using namespace cairn;
 
-struct Plugin {
+struct OpenArchiveState {
+  std::mutex lock;  // held for the whole of each call on this archive
   ArchiveSession session;
-  void* handle = nullptr;         // what the host holds for the open session
   size_t cursor = 0;              // the entry the next ReadHeader returns
   std::optional<size_t> current;  // the entry the last ReadHeader returned
   tProcessDataProc callback = nullptr;
-  // Archives opened again before being closed: their handles stay good for
-  // CloseArchive only.
-  std::list<std::pair<void*, File>> abandoned;
+};
+using Archive = std::shared_ptr<OpenArchiveState>;
+
+struct Plugin {
+  std::mutex lock;
+  std::map<void*, Archive> open;
+  // The callback set last: an archive opened next starts with it.
+  tProcessDataProc callback = nullptr;
   uintptr_t serial = 0;
 };
 
 Plugin& State() {
   static Plugin plugin;
   return plugin;
+}
+
+// The archive `handle` stands for, kept alive for the caller even if
+// another thread closes it meanwhile; none for an unknown or closed handle.
+Archive Find(void* handle) {
+  Plugin& p = State();
+  const std::lock_guard<std::mutex> guard(p.lock);
+  const auto it = p.open.find(handle);
+  return it != p.open.end() ? it->second : nullptr;
 }
 
 // Sets how the paths of one call are spelled, for the length of the call.
@@ -52,45 +70,72 @@ class PathSpelling {
 void* Open(const std::string& path, int& openResult) {
   try {
     Plugin& p = State();
-    if (p.handle != nullptr) {
-      p.abandoned.emplace_back(p.handle, std::move(p.session.archive));
-      p.handle = nullptr;
+    auto a = std::make_shared<OpenArchiveState>();
+    {
+      const std::lock_guard<std::mutex> guard(p.lock);
+      a->callback = p.callback;
     }
-    p.cursor = 0;
-    p.current.reset();
-    const int result = OpenArchiveSession(p.session, path);
+    const int result = OpenArchiveSession(a->session, path);
     if (result != kOk) {
       openResult = result;
       return nullptr;
     }
+    // Runs inside ProcessFile, under the archive's lock.
+    a->session.progress = [state = a.get()](const std::string& name, uint32_t bytes) {
+      if (state->callback == nullptr) return 1;
+      std::string copy = name;  // the host's signature takes a non-const name
+      return state->callback(copy.data(), static_cast<int>(bytes));
+    };
+    const std::lock_guard<std::mutex> guard(p.lock);
 #ifdef _WIN32
     // Windows hosts get the archive's own file handle.
-    p.handle = reinterpret_cast<void*>(p.session.archive.get());
+    void* handle = reinterpret_cast<void*>(a->session.archive.get());
 #else
-    p.handle = reinterpret_cast<void*>(++p.serial);
+    void* handle = reinterpret_cast<void*>(++p.serial);
 #endif
-    return p.handle;
+    p.open[handle] = std::move(a);
+    return handle;
   } catch (...) {
     openResult = kBadData;
     return nullptr;
   }
 }
 
-// The entry the next ReadHeader reports, or none at the end.
-const ArchiveEntry* Next() {
-  Plugin& p = State();
-  if (p.handle == nullptr || p.cursor >= p.session.entries.size()) return nullptr;
-  p.current = p.cursor;
-  return &p.session.entries[p.cursor++];
+// The entry the next ReadHeader reports, or none at the end. Called under
+// the archive's lock.
+const ArchiveEntry* Next(OpenArchiveState& a) {
+  if (a.cursor >= a.session.entries.size()) return nullptr;
+  a.current = a.cursor;
+  return &a.session.entries[a.cursor++];
+}
+
+// Runs `fill(archive, entry)` on the next entry of the archive `handle`
+// stands for: 0, 10 at the end (or for a handle that is not open), 12 when
+// `header` is missing.
+template <typename Header, typename Fill>
+int ReadNext(void* handle, Header* header, Fill fill) {
+  if (header == nullptr) return kBadData;
+  try {
+    const Archive a = Find(handle);
+    if (a == nullptr) return kEndArchive;
+    const std::lock_guard<std::mutex> guard(a->lock);
+    const ArchiveEntry* e = Next(*a);
+    if (e == nullptr) return kEndArchive;
+    return fill(*a, *e);
+  } catch (...) {
+    return kBadData;
+  }
 }
 
 int Process(void* handle, int operation, const char* destName) {
   if (operation == PK_SKIP || operation == PK_TEST) return kOk;
   try {
-    Plugin& p = State();
-    if (handle == nullptr || handle != p.handle || !p.current) return kBadData;
+    const Archive a = handle != nullptr ? Find(handle) : nullptr;
+    if (a == nullptr) return kBadData;
+    const std::lock_guard<std::mutex> guard(a->lock);
+    if (!a->current) return kBadData;
     if (destName == nullptr) return kCreateFailed;
-    return ExtractEntry(p.session, *p.current, destName);
+    return ExtractEntry(a->session, *a->current, destName);
   } catch (...) {
     return kBadData;
   }
@@ -106,19 +151,19 @@ void CopyName(Char (&to)[N], const std::basic_string<Char>& name) {
 #endif
 }
 
-int FileTimeForHost() {
+int FileTimeForHost(const ArchiveSession& s) {
 #ifdef _WIN32
-  return static_cast<int>(State().session.dosTime);
+  return static_cast<int>(s.dosTime);
 #else
   // Double Commander on Linux reads Unix seconds here.
-  return static_cast<int>(os::UnixTime(State().session.times));
+  return static_cast<int>(os::UnixTime(s.times));
 #endif
 }
 
 // The fields the host's header records share.
 template <typename Header>
-void FillCommon(Header& h) {
-  h.FileTime = FileTimeForHost();
+void FillCommon(Header& h, const ArchiveSession& s) {
+  h.FileTime = FileTimeForHost(s);
 #ifndef _WIN32
   h.FileAttr = 0100644;  // a regular file, in Unix mode bits
 #endif
@@ -132,15 +177,14 @@ WCX_EXPORT void* WCX_API OpenArchive(tOpenArchiveData* ArchiveData) {
   return Open(ArchiveData->ArcName ? ArchiveData->ArcName : "", ArchiveData->OpenResult);
 }
 
-WCX_EXPORT int WCX_API ReadHeader(void* /*hArcData*/, tHeaderData* HeaderData) {
-  if (HeaderData == nullptr) return kBadData;
-  const ArchiveEntry* e = Next();
-  if (e == nullptr) return kEndArchive;
-  CopyName(HeaderData->FileName, e->Name);
-  HeaderData->PackSize = static_cast<int>(e->PackedSize);
-  HeaderData->UnpSize = static_cast<int>(e->UnpackedSize);
-  FillCommon(*HeaderData);
-  return kOk;
+WCX_EXPORT int WCX_API ReadHeader(void* hArcData, tHeaderData* HeaderData) {
+  return ReadNext(hArcData, HeaderData, [&](const OpenArchiveState& a, const ArchiveEntry& e) {
+    CopyName(HeaderData->FileName, e.Name);
+    HeaderData->PackSize = static_cast<int>(e.PackedSize);
+    HeaderData->UnpSize = static_cast<int>(e.UnpackedSize);
+    FillCommon(*HeaderData, a.session);
+    return kOk;
+  });
 }
 
 WCX_EXPORT int WCX_API ProcessFile(void* hArcData, int Operation, char* /*DestPath*/,
@@ -151,15 +195,18 @@ WCX_EXPORT int WCX_API ProcessFile(void* hArcData, int Operation, char* /*DestPa
 
 WCX_EXPORT int WCX_API CloseArchive(void* hArcData) {
   try {
-    Plugin& p = State();
-    if (hArcData != nullptr && hArcData == p.handle) {
-      CloseArchiveSession(p.session);
-      p.handle = nullptr;
-      p.cursor = 0;
-      p.current.reset();
-    } else {
-      p.abandoned.remove_if([&](const auto& a) { return a.first == hArcData; });
+    Archive a;
+    {
+      Plugin& p = State();
+      const std::lock_guard<std::mutex> guard(p.lock);
+      const auto it = p.open.find(hArcData);
+      if (it == p.open.end()) return kOk;
+      a = std::move(it->second);
+      p.open.erase(it);
     }
+    // A call still running on this archive in another thread ends first.
+    const std::lock_guard<std::mutex> guard(a->lock);
+    CloseArchiveSession(a->session);
   } catch (...) {
   }
   return kOk;
@@ -167,15 +214,21 @@ WCX_EXPORT int WCX_API CloseArchive(void* hArcData) {
 
 WCX_EXPORT void WCX_API SetChangeVolProc(void*, tChangeVolProc) {}
 
-WCX_EXPORT void WCX_API SetProcessDataProc(void*, tProcessDataProc pProcessDataProc) {
-  Plugin& p = State();
-  p.callback = pProcessDataProc;
-  p.session.progress = [](const std::string& name, uint32_t bytes) {
-    tProcessDataProc callback = State().callback;
-    if (callback == nullptr) return 1;
-    std::string copy = name;  // the host's signature takes a non-const name
-    return callback(copy.data(), static_cast<int>(bytes));
-  };
+WCX_EXPORT void WCX_API SetProcessDataProc(void* hArcData, tProcessDataProc pProcessDataProc) {
+  try {
+    Archive a;
+    {
+      Plugin& p = State();
+      const std::lock_guard<std::mutex> guard(p.lock);
+      p.callback = pProcessDataProc;
+      const auto it = p.open.find(hArcData);
+      if (it != p.open.end()) a = it->second;
+    }
+    if (a == nullptr) return;
+    const std::lock_guard<std::mutex> guard(a->lock);
+    a->callback = pProcessDataProc;
+  } catch (...) {
+  }
 }
 
 WCX_EXPORT int WCX_API CanYouHandleThisFile(char* FileName) {
@@ -192,19 +245,25 @@ WCX_EXPORT int WCX_API GetPackerCaps(void) {
   return PK_CAPS_MULTIPLE | PK_CAPS_BY_CONTENT;
 }
 
+// Each archive has its own session: hosts may extract in the background.
+WCX_EXPORT int WCX_API GetBackgroundFlags(void) {
+  return BACKGROUND_UNPACK;
+}
+
 #ifdef _WIN32
 // The wide and 64-bit-size entry points that today's Windows hosts prefer.
-// They share the one session with the ANSI ones; paths travel as UTF-8.
+// They work on the same open archives as the ANSI ones; paths travel as
+// UTF-8.
 
 namespace {
 
 template <typename Header>
-int FillEx(Header& h, const ArchiveEntry& e) {
+int FillEx(Header& h, const OpenArchiveState& a, const ArchiveEntry& e) {
   h.PackSize = e.PackedSize;
   h.PackSizeHigh = 0;
   h.UnpSize = e.UnpackedSize;
   h.UnpSizeHigh = 0;
-  FillCommon(h);
+  FillCommon(h, a.session);
   return kOk;
 }
 
@@ -216,21 +275,19 @@ WCX_EXPORT void* WCX_API OpenArchiveW(tOpenArchiveDataW* ArchiveData) {
   return Open(os::Utf8FromWide(ArchiveData->ArcName), ArchiveData->OpenResult);
 }
 
-WCX_EXPORT int WCX_API ReadHeaderEx(void* /*hArcData*/, tHeaderDataEx* HeaderData) {
-  if (HeaderData == nullptr) return kBadData;
-  const ArchiveEntry* e = Next();
-  if (e == nullptr) return kEndArchive;
-  CopyName(HeaderData->FileName, e->Name);
-  return FillEx(*HeaderData, *e);
+WCX_EXPORT int WCX_API ReadHeaderEx(void* hArcData, tHeaderDataEx* HeaderData) {
+  return ReadNext(hArcData, HeaderData, [&](const OpenArchiveState& a, const ArchiveEntry& e) {
+    CopyName(HeaderData->FileName, e.Name);
+    return FillEx(*HeaderData, a, e);
+  });
 }
 
-WCX_EXPORT int WCX_API ReadHeaderExW(void* /*hArcData*/, tHeaderDataExW* HeaderData) {
-  if (HeaderData == nullptr) return kBadData;
-  const ArchiveEntry* e = Next();
-  if (e == nullptr) return kEndArchive;
-  // Names inside archives are in the system's code page.
-  CopyName(HeaderData->FileName, os::WideFromAnsi(e->Name));
-  return FillEx(*HeaderData, *e);
+WCX_EXPORT int WCX_API ReadHeaderExW(void* hArcData, tHeaderDataExW* HeaderData) {
+  return ReadNext(hArcData, HeaderData, [&](const OpenArchiveState& a, const ArchiveEntry& e) {
+    // Names inside archives are in the system's code page.
+    CopyName(HeaderData->FileName, os::WideFromAnsi(e.Name));
+    return FillEx(*HeaderData, a, e);
+  });
 }
 
 WCX_EXPORT int WCX_API ProcessFileW(void* hArcData, int Operation, wchar_t* /*DestPath*/,

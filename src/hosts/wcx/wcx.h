@@ -80,6 +80,7 @@ typedef int(WCX_API* tChangeVolProc)(char* ArcName, int Mode);
 
 enum { PK_SKIP = 0, PK_TEST = 1, PK_EXTRACT = 2 };
 enum { PK_CAPS_MULTIPLE = 4, PK_CAPS_BY_CONTENT = 64 };
+enum { BACKGROUND_UNPACK = 1 };
 
 WCX_EXPORT void* WCX_API OpenArchive(tOpenArchiveData* ArchiveData);
 WCX_EXPORT int WCX_API ReadHeader(void* hArcData, tHeaderData* HeaderData);
@@ -89,6 +90,7 @@ WCX_EXPORT void WCX_API SetChangeVolProc(void* hArcData, tChangeVolProc pChangeV
 WCX_EXPORT void WCX_API SetProcessDataProc(void* hArcData, tProcessDataProc pProcessDataProc);
 WCX_EXPORT int WCX_API CanYouHandleThisFile(char* FileName);
 WCX_EXPORT int WCX_API GetPackerCaps(void);
+WCX_EXPORT int WCX_API GetBackgroundFlags(void);
 
 #ifdef _WIN32
 WCX_EXPORT void* WCX_API OpenArchiveW(tOpenArchiveDataW* ArchiveData);

@@ -301,9 +301,14 @@ TEST(Cli, ExtractStopsAtTheFirstOutputThatCannotBeWritten) {
   const std::string path =
       dir.write("g.glb", Glb({{"a", Text("a")}, {"big", Pattern(200000)}, {"c", Text("c")}}));
   const std::string out = dir.path("out");
-  const ToolRun r = Cairn({"extract", "-q", path, "-o", out}, "", "trap '' XFSZ; ulimit -f 64; ");
+  // A coverage build's counters cannot be written under the limit either: they
+  // go to a folder of their own, so that they spoil no other run's.
+  const ToolRun r = Cairn({"extract", "-q", path, "-o", out}, "",
+                          "trap '' XFSZ; ulimit -f 64; GCOV_PREFIX=" + dir.path("gcov") + " ");
   EXPECT_EQ(r.status, 3);
-  EXPECT_EQ(r.errLines(), (Strings{"cairn: " + path + ": big: cannot write: File too large",
+  Strings said = r.errLines();  // the tool's lines, not the coverage runtime's
+  std::erase_if(said, [](const std::string& line) { return line.rfind("cairn: ", 0) != 0; });
+  EXPECT_EQ(said, (Strings{"cairn: " + path + ": big: cannot write: File too large",
                                    "cairn: " + path + ": stopped: 1 of 3 entries extracted to " +
                                        out}));
   EXPECT_EQ(FilesBelow(out), (Files{{"a", Text("a")}}));

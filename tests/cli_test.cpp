@@ -8,6 +8,10 @@
 #include <sstream>
 #include <tuple>
 
+#ifdef CAIRN_CLI_PATH
+#include <nlohmann/json.hpp>
+#endif
+
 #include "builder.h"
 #include "detect_fixtures.h"
 #include "formats/registry.h"
@@ -113,6 +117,29 @@ TEST(Cli, ListShowsSizesNamesAndTotal) {
   EXPECT_EQ(total, " 3000014   3000014  8 entries");
   ListedRows(Cairn({"list", dir.write("one.glb", Glb({{"E1M1", Text("abc")}}))}).out, &total);
   EXPECT_EQ(total, "       3         3  1 entry");
+}
+
+TEST(Cli, ListJsonAndLong) {
+  TempDir dir;
+  const std::string path = dir.write("j.glb", Glb({{"a.txt", Text("abc")}, {"d\\b", Text("xy")}}));
+  const ToolRun r = Cairn({"list", "--json", "--long", path});
+  EXPECT_EQ(r.status, 0);
+  const nlohmann::json j = nlohmann::json::parse(r.out);
+  EXPECT_EQ(j["archive"], path);
+  EXPECT_EQ(j["format"], 15);
+  EXPECT_EQ(j["format_name"], "glb2");
+  EXPECT_EQ(j["entries"], nlohmann::json::parse(R"([
+      {"name": "a.txt", "size": 3, "packed": 3, "converted": false,
+       "offset": 104, "extra": 0, "flag": 0},
+      {"name": "d/b", "size": 2, "packed": 2, "converted": false,
+       "offset": 107, "extra": 0, "flag": 0}])"));
+  EXPECT_EQ(j["total"], nlohmann::json::parse(R"({"entries": 2, "size": 5, "packed": 5})"));
+  EXPECT_EQ(nlohmann::json::parse(Cairn({"list", "--json", path}).out)["entries"][1].size(), 4u);
+  EXPECT_EQ(ListedRows(Cairn({"list", "--long", path}).out)[1],
+            "       2         2     107  00000000     0  d/b");
+  const ToolRun bad = Cairn({"list", "--json", dir.path("none.glb")});
+  EXPECT_EQ(bad.status, 1);
+  EXPECT_EQ(bad.out, "");
 }
 
 TEST(Cli, AnArchiveThatCannotBeReadIsOneLineWithTheReason) {

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # Installs the Debian packages that cairn is built with, unless all of them
 # are present already. Runs apt-get directly as root, through sudo otherwise.
-#   install-packages.sh          the build: compiler, zlib, GoogleTest, CLI11, fmt
+#   install-packages.sh          the build: compiler, zlib, GoogleTest, CLI11, fmt, nlohmann-json
 #   install-packages.sh --all    also what the whole test run needs: the real
 #                                picture and sound decoders, the Windows
 #                                cross-compilers and Wine, clang's fuzzer, gcovr,
@@ -9,7 +9,7 @@
 #                                and quakespasm when they can be installed
 set -euo pipefail
 
-packages=(cmake make g++ zlib1g-dev libgtest-dev libcli11-dev libfmt-dev)
+packages=(cmake make g++ zlib1g-dev libgtest-dev libcli11-dev libfmt-dev nlohmann-json3-dev)
 if [ "${1:-}" = "--all" ]; then
   packages+=(imagemagick sox python3 libbenchmark-dev
              g++-mingw-w64-i686 g++-mingw-w64-x86-64 libz-mingw-w64-dev wine64 zip

@@ -9,6 +9,7 @@
 #include <cstdio>
 #include <exception>
 #include <filesystem>
+#include <nlohmann/json.hpp>
 #include <optional>
 #include <random>
 #include <set>
@@ -21,6 +22,7 @@
 #include "formats/archive.h"
 #include "formats/registry.h"
 #include "hosts/cli/names.h"
+#include "media/conversion.h"
 
 namespace cairn::cli {
 namespace {
@@ -275,22 +277,76 @@ Outcome ExtractOne(ArchiveSession& s, size_t index, const fs::path& root, const 
 
 }  // namespace
 
-int ListCommand(const std::string& archive) {
-  ArchiveSession s;
-  if (!OpenOrSay(s, archive)) return kExitFailed;
+namespace {
+
+// True for a converted copy listed in one of the "_TO_*_" folders.
+bool IsConverted(std::string_view name) {
+  for (std::string_view folder : {kTgaFolder, kBmpFolder, kWavFolder, kJpgFolder})
+    if (name.substr(0, folder.size()) == folder) return true;
+  return false;
+}
+
+void PrintJson(const ArchiveSession& s, const std::string& archive, bool lng) {
+  const FormatInfo* info = FindFormat(s.format);
+  nlohmann::ordered_json entries = nlohmann::ordered_json::array();
   uint64_t unpacked = 0, packed = 0;
   for (const ArchiveEntry& e : s.entries) {
+    nlohmann::ordered_json j = {{"name", Shown(e.Name)},
+                                {"size", e.UnpackedSize},
+                                {"packed", e.PackedSize},
+                                {"converted", IsConverted(e.Name)}};
+    if (lng) {
+      j["offset"] = e.Offset;
+      j["extra"] = e.Extra;
+      j["flag"] = e.Flag;
+    }
+    entries.push_back(std::move(j));
     unpacked += e.UnpackedSize;
     packed += e.PackedSize;
   }
+  const nlohmann::ordered_json doc = {
+      {"archive", archive},
+      {"format", s.format},
+      {"format_name", info != nullptr ? info->shortName : "?"},
+      {"entries", std::move(entries)},
+      {"total", {{"entries", s.entries.size()}, {"size", unpacked}, {"packed", packed}}}};
+  // Bytes that are not UTF-8 become U+FFFD rather than failing the listing.
+  fmt::print("{}\n", doc.dump(2, ' ', false, nlohmann::json::error_handler_t::replace));
+}
+
+}  // namespace
+
+int ListCommand(const ListOptions& o) {
+  ArchiveSession s;
+  if (!OpenOrSay(s, o.archive)) return kExitFailed;
+  if (o.json) {
+    PrintJson(s, o.archive, o.lng);
+    return kExitDone;
+  }
+  uint64_t unpacked = 0, packed = 0;
+  uint32_t lastOffset = 0;
+  for (const ArchiveEntry& e : s.entries) {
+    unpacked += e.UnpackedSize;
+    packed += e.PackedSize;
+    lastOffset = std::max(lastOffset, e.Offset);
+  }
   const FormatInfo* info = FindFormat(s.format);
-  fmt::print("Archive: {} (format {}, {})\n\n", Printable(archive), s.format,
+  fmt::print("Archive: {} (format {}, {})\n\n", Printable(o.archive), s.format,
              info != nullptr ? info->shortName : "?");
   const size_t w = std::max<size_t>({8, Digits(unpacked), Digits(packed)});
-  const std::string rule = fmt::format("{0:-<{1}}  {0:-<{1}}  ----\n", "", w);
-  fmt::print("{:>{}}  {:>{}}  Name\n{}", "Size", w, "Packed", w, rule);
-  for (const ArchiveEntry& e : s.entries)
-    fmt::print("{:>{}}  {:>{}}  {}\n", e.UnpackedSize, w, e.PackedSize, w, Shown(e.Name));
+  const size_t wo = std::max<size_t>(6, Digits(lastOffset));
+  // --long: Offset, Extra (hex) and Flag between the sizes and the name.
+  const std::string longRule = o.lng ? fmt::format("{0:-<{1}}  --------  ----  ", "", wo) : "";
+  const std::string rule = fmt::format("{0:-<{1}}  {0:-<{1}}  {2}----\n", "", w, longRule);
+  const std::string longHead =
+      o.lng ? fmt::format("{:>{}}  {:>8}  {:>4}  ", "Offset", wo, "Extra", "Flag") : "";
+  fmt::print("{:>{}}  {:>{}}  {}Name\n{}", "Size", w, "Packed", w, longHead, rule);
+  for (const ArchiveEntry& e : s.entries) {
+    const std::string longCells =
+        o.lng ? fmt::format("{:>{}}  {:08x}  {:>4}  ", e.Offset, wo, e.Extra, e.Flag) : "";
+    fmt::print("{:>{}}  {:>{}}  {}{}\n", e.UnpackedSize, w, e.PackedSize, w, longCells,
+               Shown(e.Name));
+  }
   const size_t n = s.entries.size();
   fmt::print("{}{:>{}}  {:>{}}  {} {}\n", rule, unpacked, w, packed, w, n,
              n == 1 ? "entry" : "entries");

@@ -17,7 +17,12 @@ enum ExitStatus : int {
   kExitStopped = 130,  // interrupted; the entry being written was removed
 };
 
-int ListCommand(const std::string& archive);
+struct ListOptions {
+  std::string archive;
+  bool json = false;  // one JSON document instead of the table
+  bool lng = false;   // also each entry's offset, extra value and flag
+};
+int ListCommand(const ListOptions& options);
 
 // What becomes of an entry whose output path an earlier entry of the same run
 // has written: it takes a numbered name (THINGS_1, a_1.txt), is left out, or

@@ -36,9 +36,11 @@ int main(int argc, char** argv) {
   app.require_subcommand(1);
   app.footer(kExitStatusHelp);
 
-  std::string listArchive;
+  ListOptions listing;
   CLI::App* list = app.add_subcommand("list", "Show the entries of an archive with their sizes");
-  list->add_option("ARCHIVE", listArchive, "The archive file")->required();
+  list->add_option("ARCHIVE", listing.archive, "The archive file")->required();
+  list->add_flag("--json", listing.json, "Print one JSON document instead of the table");
+  list->add_flag("-l,--long", listing.lng, "Also show each entry's offset, extra value and flag");
 
   ExtractOptions extract;
   CLI::App* extractCommand = app.add_subcommand(
@@ -85,7 +87,7 @@ int main(int argc, char** argv) {
   }
 
   try {
-    if (list->parsed()) return ListCommand(listArchive);
+    if (list->parsed()) return ListCommand(listing);
     if (extractCommand->parsed()) {
       extract.duplicates = duplicates == "skip"        ? Duplicates::Skip
                            : duplicates == "overwrite" ? Duplicates::Overwrite

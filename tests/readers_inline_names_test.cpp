@@ -1,5 +1,4 @@
-// Samples and refusals of the readers whose records carry the names: "MHX XS
-// V1.0", "DIR", "FAR!byAZ", "MageGold", "DFP1", "PFF2", "PFF3", "CMPR", "PVOL".
+// Readers whose records carry the names.
 #include <gtest/gtest.h>
 
 #include "samples.h"
@@ -14,12 +13,10 @@ CAIRN_SAMPLES(InlineNameSamples) {
   mhx.text("MHX XS V1.0").padTo(48).u32(448 + 2 * 64).padTo(64);
   mhx.name("sub/beta.bin", 48).u32(192).u32(70).fill(8, 0xEE);
   mhx.name(full, 48).u32(262).u32(0).fill(8, 0xEE).bytes(b);
-  // A trailing partial record is not listed.
   ArchiveBuilder mage;
   mage.text("MageGold").padTo(40).u32(104).u32(2 * 64 + 20).padTo(104);
   mage.name("readme.txt", 56).u32(252).u32(5).name("dir/x.bin", 56).u32(257).u32(70);
   mage.fill(20, 0xAA).bytes(a).bytes(b);
-  // Records of 32 and 36 bytes; their first and fourth words are not used.
   const auto pff = [&](char version, uint32_t width, std::string_view second) {
     ArchiveBuilder w;
     w.u32(20).text("PFF").u8(version).u32(2).u32(16 + width).u32(95).bytes(a).bytes(b);
@@ -41,7 +38,6 @@ CAIRN_SAMPLES(InlineNameSamples) {
   ArchiveBuilder cmpr;
   cmpr.text("CMPR").u32(123 - 4).bytes(a).bytes(b).u32(5).u32(0).u32(5).text("a.bin").fill(3);
   cmpr.u32(70).u32(5).u32(8).text("data/b.x").u32(83 - 8);
-  // The names end on an odd position: a byte of padding precedes the records.
   ArchiveBuilder pvol;
   pvol.text("PVOL").u32(83).bytes(a).bytes(b).text("vols").u32(16).text("x.dat").u8(0);
   pvol.text("sub/y.txt").u8(0).u8(0).text("voli").u32(34).fill(8).u32(0).u32(5).u8(0);
@@ -60,7 +56,6 @@ CAIRN_SAMPLES(InlineNameSamples) {
   };
 }
 
-// Directories lie in the file, counts fit them, names take 259 characters at most.
 TEST(InlineNames, RefusesBadDirectories) {
   const SampleTable rows = InlineNameSamples();
   const auto far = [](uint32_t n) {
@@ -71,14 +66,7 @@ TEST(InlineNames, RefusesBadDirectories) {
   ExpectLists(3, far(259), {{std::string(259, 'F'), 0, 4, 4, 0, 0}});
   ExpectRefused({
       {"FAR name of 260", 3, far(260)},
-      {"MHX region end below 448", 1, With(rows[0], 48, 447)},
-      {"MHX partial record past the end", 1, With(rows[0], 48, 448 + 270)},
-      {"PFF record too short for a name", 19, With(rows[2], 12, 15)},
-      {"DIR end before the start", 2, With(rows[4], 4, 4000)},
-      {"FAR past the end", 3, With(rows[5], 12, 5000)},
       {"FAR count that cannot fit", 3, With(rows[5], 91, 0x40000000)},
-      {"DFP1 count that cannot fit", 18, With(rows[6], 8, 5)},
-      {"PVOL more records than names", 38, With(rows[8], 112, 3 * 17)},
   });
 }
 

@@ -82,7 +82,7 @@ struct Row {
 constexpr std::nullopt_t kRefused = std::nullopt;
 
 std::vector<Row> Rows() {
-  const Bytes wad2 = Cat({Bytes(8), {16}}), pack = Cat({Bytes(100), {16}}), d13 = Pattern(13);
+  const Bytes wad2 = Cat({Bytes(8), {16}}), d13 = Pattern(13);
   const Bytes px = Pattern(64), z = Compress(px), tex = Pattern(32), bgra = Pattern(8, 30);
   const auto zs = static_cast<uint32_t>(z.size());
   const Bytes many = Cat({Le({300}, 2), Pattern(900), Le({0}), {7}});
@@ -109,18 +109,13 @@ std::vector<Row> Rows() {
   const Bytes c565 = Pick(rotated, Le({0xF800, 0x07E0, 0x001F}, 2), 2);
   // "JDLZ", 4 bytes, decoded size, block size, coded bytes: 16 x 0x11, 1024 x 0x22.
   const Bytes coded = Cat({Text("JDLZ"), Le({0, 1040, 24}), {10, 3, 0x11, 0, 12, 0x22, 48, 252}});
-  const auto jdlz = [](uint32_t decoded, uint32_t block) {
-    return Cat({Text("JDLZ"), Le({0, decoded, block}), Bytes(8)});
-  };
   const Bytes samples = Pattern(1000), snd = Cat({Bytes(8), samples}), ilbm = Pattern(0x1234);
   const Bytes gaba = Cat({Le({996}), Pattern(996)});  // the sound brings its data size
 
   return {
       Row("4 WAD2 via palette 2", 4, wad2, {{"w.tga", 0, 21, 9, 0x10001, 1}},
           Cat({Tga(1, 1, 24, 0x21), {7, 11, 15}}), {15, 11, 7, 255}),
-      Row("70 short index data", 70, pack, {{"", 0, 21, 100, 0x10001, 2}}, kRefused),
       Row("39 Flag 4", 39, z, {{"", 0, 82, zs, 0x00040008, 4}}, Cat({Tga(8, 4, 16, 0x20), px})),
-      Row("39 inflates past the picture", 39, z, {{"", 0, 81, zs, 0x00040004, 3}}, kRefused),
       Row("78 300 colours, 256 mapped", 78, many, {{"", 0, 787, 907, 0x00010001, 16}},
           Cat({Tga(1, 1, 16, 0x20, Slice(Pattern(900), 0, 768)), {7}})),
       Row("92 pixels at 41 + name length", 92, chunk, {{"", 3, 26, 104, 0x00010002, 1}},
@@ -131,14 +126,10 @@ std::vector<Row> Rows() {
           Cat({Tga(1, 2, 32, 0), Swap02(Slice(d111, 33, 8), 4)}), Quads({40, 50, 60, 10, 20, 30})),
       Row("145 indexed, past 250 colours black", 145, obj, {{"", 7, 34, 9, 0x00020002, 1}},
           Cat({Tga(2, 2, 32, 0x20), Pick({0, 249}, Pattern(1000), 4), Bytes(8)})),
-      Row("145 24 bits", 145, obj, {{"", 7, 30, 9, 0x00020002, 2}},
-          Cat({Tga(2, 2, 24, 0x20), Slice(obj, 125, 12)})),
       Row("151 trailing palette", 151, trail, {{"p.tga", 12, 788, 2, 0x00010002, 24}},
           Cat({Tga(2, 1, 8, 0x20, Slice(trail, 14, 768)), {1, 255}}), Quads({9, 8, 7, 4, 5, 6})),
-      Row("137 stored", 137, own, {{"", 0, 524, 524, 0, 0}}, own),
       Row("137 own 16-bit palette", 137, own, {{"", 0, 26, 524, 0x00020002, 1}},
           Cat({Tga(2, 2, 16, 0x20), Pick({2, 0, 255, 1}, Slice(own, 12, 512), 2)})),
-      Row("137 Flag 4: nothing", 137, own, {{"", 0, 26, 524, 0x00020002, 4}}, Bytes{}),
       Row("137 16-bit pixels", 137, p16, {{"s.tga", 0, 26, 8, 0x00020002, 3}},
           Cat({Tga(2, 2, 16, 0x20), p16}), Quads({255, 0, 0, 0, 255, 0, 0, 0, 255, 255, 255, 255})),
 
@@ -146,33 +137,20 @@ std::vector<Row> Rows() {
           Cat({Bmp(132150, 512, 256, 8), Swap02(pal, 4), BmpRows(big, 512)})),
       Row("104 companion, any case", 104, raw, in104("gfx\\title.raw.bmp", 4096, acts),
           Cat({top, Swap02(Quads(act, 0), 4), rows}), Quads(Pick(pix, act, 3))),
-      Row("104 palette 4", 104, raw, in104("p.raw.bmp", 4096, {{"p.act", 4096, 700, 700, 0, 0}}),
-          Cat({top, Bytes(kBuiltInPalette4.begin(), kBuiltInPalette4.end()), rows})),
-      Row("104 unknown picture size", 104, raw, in104("p.raw.bmp", 4095, {}), kRefused),
       Row("135 palette 3, odd width padded", 135, seq, {{"s.bmp", 29, 1086, 6, 0, 2}},
           Cat({Bmp(1086, 3, 2, 8), pal3, {3, 0, 1, 0, 0, 1, 2, 0}})),
       Row("149 flipped and padded", 149, c565, {{"c.bmp", 0, 90, 18, 0x00030003, 0}},
           Cat({Bmp(90, 3, 3, 16), BmpRows(c565, 6)}),
           Quads(Pick(rotated, {255, 0, 0, 0, 255, 0, 0, 0, 255}, 3))),
-      Row("140 past the archive", 140, c565, {{"", 0, 78, 18, 0xFFFFFFFF, 0}}, kRefused),
 
       Row("79 DXT1", 79, dxt1, {{"t.dds", 0, 136, 8, 0x00040004, '1'}},
           Cat({Dds(4, 4, 0, '1'), dxt1}), Quads(Pick(Bytes(16), {255, 0, 0}, 3))),
       Row("79 Flag 6: 24 bits", 79, tex, {{"", 0, 160, 32, 0x00020004, 6}},
           Cat({Dds(2, 4, 0, 24), tex})),
-      Row("79 no template", 79, tex, {{"", 0, 160, 32, 0x00020004, 7}}, kRefused),
       Row("124 palette, signed height", 124, tex, {{"", 0, 160, 32, 0x8000FFFF, 0x31}},
           Cat({Dds(0xFFFF8000, 0xFFFF, 3, 'P'), tex})),
-      Row("123 no template", 123, tex, {{"", 0, 160, 32, 0x00100010, 0x10}}, kRefused),
       Row("123 coded palette moves first", 123, coded, {{"", 0, 1168, 24, 0x00040004, 0x11}},
           Cat({Dds(4, 4, 1, 'P'), Bytes(1024, 0x22), Bytes(16, 0x11)})),
-      Row("123 coded RGBA", 123, coded, {{"", 0, 1168, 24, 0x00040004, 0x02}},
-          Cat({Dds(4, 4, 0, 32), Bytes(16, 0x11), Bytes(1024, 0x22)})),
-      Row("123 palette under 1024 bytes", 123, jdlz(1, 19), {{"", 0, 129, 19, 0, 1}}, kRefused),
-      Row("123 over 2049 per byte", 123, jdlz(16393, 24), {{"", 0, 200, 24, 0, 2}}, kRefused),
-      Row("123 block under its header", 123, jdlz(4, 15), {{"", 0, 200, 24, 0, 2}}, kRefused),
-      Row("123 a tag in under 16 bytes", 123, jdlz(0, 0), {{"", 0, 136, 8, 0x00010001, 0x25}},
-          Cat({Dds(1, 1, 2, '5'), Slice(jdlz(0, 0), 0, 8)})),
       Row("124 32 bits", 124, bgra, {{"u.dds", 0, 136, 8, 0x00010002, 2}},
           Cat({Dds(1, 2, 0, 32), bgra}), Swap02(bgra, 4)),
 
@@ -185,7 +163,6 @@ std::vector<Row> Rows() {
       Row("131 JFIF start", 131, d13, {{"", 0, 23, 13, 0, 0}},
           Cat({{0xFF, 0xD8, 0xFF, 0xE0, 0, 16}, Text("JFIF"), d13})),
       Row("155 under 16 bytes", 155, ilbm, {{"", 0, 15, 15, 0, 0}}, kRefused),
-      Row("155 past the archive", 155, ilbm, {{"", 0xFFFFFFF8, 32, 32, 0, 0}}, kRefused),
   };
 }
 

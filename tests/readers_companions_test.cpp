@@ -27,14 +27,12 @@ CAIRN_SAMPLES(CompanionSamples) {
   wd.u32(2).u32(72).u32(5).fill(12).u32(10).u32(77).u32(70).fill(12).u32(0).u32(16);
   wd.text("dir/b.bin").u8(0).text("a.txt").u8(0).bytes(a).bytes(b);
   ended.u32(21).text("A").u8(0).u32(26).text("B").u8(0).u32(276).fill(5).bytes(a).bytes(c);
-  // The last record has 4 spare bytes behind it.
   const Bytes dir = B().u32(1).u32(2).name("b.bin", 24).u32(3).u32(0).name("c", 28).get();
   return {
       Row({"offsets", 90, "game.dat", derived.get()}, {{"A", 17, Pattern(33)}, {"BC", 50, b}}),
       Row({"sectors", 98, "disc.img", s, {}, {}, {{"disc.dir", dir}}},
           {{"b.bin", 2048, Slice(s, 2048, 4096)}, {"c", 6144, {}}}),
       Row({"40-byte heads", 110, "game.hdr", heads.get()}, {{"first", 52, a}, {n16, 97, b}}),
-      // The rule taking every first word of 0 comes before this one.
       Row({"16-byte records", 130, "x.rec", unnamed.get(), {}, {}, {}, false},
           {{"x.rec.000000", 56, a}, {"x.rec.000001", 61, b}}),
       Row({"data behind", 133, "game.big", bigf.get()}, {{"one", 105, a}, {"two", 110, c}}),
@@ -54,7 +52,7 @@ CAIRN_SAMPLES(SinglePictureSamples) {
   nif.padTo(107).u32(2).u32(2).padTo(125).bytes(Pattern(12));
   const Bytes olz = Cat({{0xFB}, Pattern(112), {0, 0, 0xFC}}), z = Compress(inner, 0);
   const auto zs = uint32_t(z.size());
-  B bmp = B().bytes(BmpHeader(166, 9, 5, 16));  // 9 x 5 pixels, bottom row first, rows of 20 bytes
+  B bmp = B().bytes(BmpHeader(166, 9, 5, 16));
   for (int row = 4; row >= 0; --row) bmp.bytes(Slice(px, row * 18, 18)).fill(2);
   return {
       One("photo01.syj", 131, syj, {"photo01.jpg", 0, 212, 202, 0, 0}, Cat({JpegStart(), syj})),
@@ -76,20 +74,11 @@ CAIRN_SAMPLES(SinglePictureSamples) {
 }
 
 TEST(OffsetTablesAndPictures, RefuseWhatCannotHoldTogether) {
-  ExpectLists(134, Bytes(614400, 1), {{"test.tga", 0, 614418, 614400, 0x01E00280, 16}});
   const SampleTable rows = CompanionSamples(), pictures = SinglePictureSamples();
   ExpectRefused({
-      {"offsets going back", 90, With(rows[0], 6, 10)},
       {"walk never reaching the end of the file", 133, With(rows[4], 96, 0)},
-      {"name past its block", 148, With(rows[5], 24, 16)},
-      {"sizes going back", 153, With(rows[6], 6, 5)},
-      {"side beyond 16 bits", 139, With(pictures[2], 6, 0x10000)},
-      {"width 0", 141, With(pictures[4], 4, 0)},
       {"pixels past 4 GiB", 149, B().bytes(With(pictures[6], 4, 0xFFFF)).patch32(8, 0xFFFF).get()},
-      {"stream inflating to less than its length", 109,
-       B().u8(1).u32(95).u32(3).bytes(Compress({1, 2, 3}, 0)).padTo(104).get()},
   });
-  ExpectRefused(98, rows[1].bytes, "lone.img");
   Sample far = rows[1];
   far.companions[0].second = B().u32(0x200000).u32(1).name("far", 24).get();
   Opened o;

@@ -56,13 +56,8 @@ CAIRN_SAMPLES(CountedRecordSamples) {
 TEST(CountedRecords, RefusesBrokenDirectories) {
   const SampleTable rows = CountedRecordSamples();
   ExpectRefused({
-      {"MH3 region ending before 64", 61, With(rows[2], 48, 63)},
       {"VER2 sector beyond 4 GiB", 62, With(rows[3], 8, 0x200000)},
-      {"MQDB data past the end", 63, With(rows[4], 40, 200)},
-      {"MIX1 names before the records", 67, With(rows[6], 8, 12)},
       {"THU3 name of 260", 68, With(rows[7], 40, 260)},
-      {"THU3 offsets going back", 68, With(rows[7], 51, 117)},
-      {"LP1C negative name length", 74, With(rows[9], 12, 0x746E6980)},  // 0x80, then "int"
   });
 }
 
